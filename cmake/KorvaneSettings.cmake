@@ -1,0 +1,33 @@
+# What every target of this project is compiled with.
+
+set(CMAKE_CXX_STANDARD 20)
+set(CMAKE_CXX_STANDARD_REQUIRED ON)
+set(CMAKE_CXX_EXTENSIONS OFF)
+set(CMAKE_POSITION_INDEPENDENT_CODE ON)
+set(CMAKE_CXX_VISIBILITY_PRESET hidden)
+set(CMAKE_VISIBILITY_INLINES_HIDDEN ON)
+set(CMAKE_EXPORT_COMPILE_COMMANDS ON)
+
+if(NOT CMAKE_BUILD_TYPE AND NOT CMAKE_CONFIGURATION_TYPES)
+  set(CMAKE_BUILD_TYPE RelWithDebInfo CACHE STRING "" FORCE)
+endif()
+
+find_program(CCACHE_PROGRAM ccache)
+if(CCACHE_PROGRAM AND NOT CMAKE_CXX_COMPILER_LAUNCHER)
+  set(CMAKE_CXX_COMPILER_LAUNCHER "${CCACHE_PROGRAM}")
+endif()
+
+# The results of floating-point code are part of the interface: no fused
+# multiply-add may be formed behind the source's back.
+add_compile_options(-ffp-contract=off)
+add_compile_options(-Wall -Wextra -Wpedantic -Wshadow -Wnon-virtual-dtor
+                    -Woverloaded-virtual -Wcast-qual -Wformat=2)
+if(KORVANE_DEVELOPER)
+  add_compile_options(-Werror)
+endif()
+if(KORVANE_SANITIZE)
+  add_compile_options(-fsanitize=${KORVANE_SANITIZE} -fno-omit-frame-pointer
+                      -fno-sanitize-recover=all)
+  add_link_options(-fsanitize=${KORVANE_SANITIZE})
+endif()
+add_link_options(-Wl,--as-needed)

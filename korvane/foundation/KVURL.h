@@ -1,0 +1,79 @@
+#pragma once
+
+#include <korvane/foundation/KVString.h>
+#include <korvane/platform/CFURL.h>
+
+/// A platform file reference; there is none here, so it is never filled in.
+struct FSRef;
+
+/// The place of a file, or of a numbered sequence of image files.
+///
+///     KVURL frames("/shots/a[###].tif", 1, 20);    // a001.tif to a020.tif
+///     frames.isSequence();                          // true
+///     std::unique_ptr<KVURL> fifth(frames.getURLforIndex(4));   // .../a005.tif
+///
+/// A sequence has a bracketed pattern of "#" or "@" in its last path component and may end in
+/// ":start:end". A pattern with an "@" prints the number as it is; one of "#" alone fills it with
+/// zeros to its length.
+///
+/// A null URL answers every text with the empty string. Texts that are "the URL's string" are
+/// percent-encoded (RFC 3986), paths are not.
+class KV_EXPORT KVURL {
+public:
+    KVURL() noexcept = default;
+    /// From a POSIX path in UTF-8; an empty or null path gives a null URL. A relative path is made
+    /// absolute at once.
+    explicit KVURL(char const* path, bool isDirectory = false);
+    /// The path with ":start:end" behind it.
+    KVURL(char const* path, unsigned int start, unsigned int end);
+    /// Retains; null gives a null URL.
+    explicit KVURL(__CFURL const* url) noexcept : url_(url) {}
+    /// A text with "://" in it is taken as a URL, any other as a POSIX path.
+    explicit KVURL(KVString const& text, bool isDirectory = false);
+
+    bool isNull() const noexcept { return url_.get() == nullptr; }
+    /// Unowned; null for a null URL.
+    CFURLRef cf_url() const noexcept { return url_; }
+    /// By the URL's string, unit by unit; two null URLs are equal.
+    friend bool operator==(KVURL const& a, KVURL const& b) { return CFEqual(a.url_, b.url_); }
+
+    /// "file://" and the host name.
+    KVString getHostnameAndPrefixString() const;
+    /// The URL's string.
+    KVString getAbsoluteString() const;
+    KVString getAsURLString() const;
+    /// The POSIX path, without a "/" at its end.
+    KVString getAsFileSystemString() const;
+    /// The path of the directory that it lies in.
+    KVString getPathAsFileSystemString() const;
+    KVString getContainingFolder() const;
+    KVString getContainingFolderAsURLString() const;
+    /// The last path component, whole, without its extension, and the extension alone (no dot).
+    KVString getFilename() const;
+    KVString getShortFilename() const;
+    KVString getExtension() const;
+    /// False: there are no file references here.
+    bool getFSRef(FSRef* reference) const noexcept;
+    /// The path as a new array of bytes (`delete[]`), zero-terminated, with "?" for each UTF-16
+    /// unit that is not ASCII; its length goes to `*length` if not null. Null for a null URL.
+    char* getString(unsigned int* length) const;
+    void debugShow() const noexcept {}
+
+    // --- Image sequences ---
+
+    bool isSequence() const;
+    /// The number behind the last colon but one, and behind the last colon, of the last path
+    /// component; -1 when there is none.
+    int getSequenceStart() const;
+    int getSequenceEnd() const;
+    /// End minus start plus 1.
+    int getSequenceLength() const;
+    /// The file of frame `start + index`, which the caller deletes. Null for a null URL, one that
+    /// is no sequence, and an index beyond a known end.
+    KVURL* getURLforIndex(unsigned int index) const;
+    /// This URL without its ":start:end".
+    KVURL getSequenceURL() const;
+
+private:
+    KVCFRef<CFURLRef> url_;
+};

@@ -1,0 +1,17 @@
+#pragma once
+
+#include <korvane/foundation/KVExport.h>
+
+#include <cstdint>
+
+/// 128 bits as four 32-bit words, the first one in front when written.
+struct KV_EXPORT KVUUID {
+    std::uint32_t words[4] = {0, 0, 0, 0};
+
+    /// "XXXXXXXX-XXXX-XXXX-XXXX-XXXXXXXXXXXX" in upper case, in a `calloc`ed block of 41 bytes that
+    /// the caller frees.
+    char* toCStr() const;
+
+    friend bool operator==(KVUUID const&, KVUUID const&) = default;
+    friend auto operator<=>(KVUUID const&, KVUUID const&) = default;
+};

@@ -1,0 +1,56 @@
+#pragma once
+
+#include <korvane/platform/CFString.h>
+
+#include <string_view>
+#include <utility>
+#include <vector>
+
+/// Objects under string keys, kept in the order in which their keys first came. A
+/// `CFDictionaryRef` is read only, a `CFMutableDictionaryRef` can be changed.
+struct KV_EXPORT __CFDictionary final : NSObject {
+    __CFDictionary() = default;
+    /// Shares the values, retained.
+    __CFDictionary(__CFDictionary const& other);
+    __CFDictionary& operator=(__CFDictionary const&) = delete;
+    ~__CFDictionary() override;
+
+    std::size_t count() const noexcept { return entries_.size(); }
+    /// Unowned; null when there is no such key.
+    NSObject const* value(CFStringRef key) const noexcept;
+    NSObject const* value(std::string_view asciiKey) const noexcept;
+    CFStringRef keyAtIndex(std::size_t index) const noexcept { return entries_[index].first; }
+    NSObject const* valueAtIndex(std::size_t index) const noexcept
+    {
+        return entries_[index].second;
+    }
+
+    /// Retains both. A key that is there keeps its place. A null value removes the key.
+    void setValue(CFStringRef key, NSObject const* value);
+    void setValue(std::string_view asciiKey, NSObject const* value);
+    void removeValue(CFStringRef key);
+    void removeAllValues() noexcept;
+
+    /// The same keys with equal values, in any order.
+    bool isEqual(NSObject const* other) const override;
+    std::size_t hash() const override;
+    KVString description() const override;
+
+private:
+    std::vector<std::pair<CFStringRef, NSObject const*>> entries_;
+};
+
+using CFDictionaryRef = __CFDictionary const*;
+using CFMutableDictionaryRef = __CFDictionary*;
+using NSDictionary = __CFDictionary;
+using NSMutableDictionary = __CFDictionary;
+
+KV_EXPORT CFMutableDictionaryRef CFDictionaryCreateMutable(CFAllocatorRef, CFIndex capacity);
+KV_EXPORT CFDictionaryRef CFDictionaryCreateCopy(CFAllocatorRef, CFDictionaryRef);
+KV_EXPORT CFMutableDictionaryRef CFDictionaryCreateMutableCopy(CFAllocatorRef, CFIndex capacity,
+                                                               CFDictionaryRef);
+KV_EXPORT CFIndex CFDictionaryGetCount(CFDictionaryRef) noexcept;
+KV_EXPORT CFTypeRef CFDictionaryGetValue(CFDictionaryRef, CFStringRef key) noexcept;
+KV_EXPORT bool CFDictionaryContainsKey(CFDictionaryRef, CFStringRef key) noexcept;
+KV_EXPORT void CFDictionarySetValue(CFMutableDictionaryRef, CFStringRef key, CFTypeRef value);
+KV_EXPORT void CFDictionaryRemoveValue(CFMutableDictionaryRef, CFStringRef key);
