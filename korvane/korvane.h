@@ -33,3 +33,11 @@
 #include <korvane/foundation/KVURL.h>
 #include <korvane/foundation/KVUUID.h>
 #include <korvane/foundation/KVVersion.h>
+
+#include <korvane/serialization/KVIgnoreElement.h>
+#include <korvane/serialization/KVScope.h>
+#include <korvane/serialization/KVSerializer.h>
+#include <korvane/serialization/KVSerializerReadStream.h>
+#include <korvane/serialization/KVSerializerWriteStream.h>
+#include <korvane/serialization/KVStream.h>
+#include <korvane/serialization/KVStreamElement.h>
