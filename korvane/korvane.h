@@ -33,3 +33,7 @@
 #include <korvane/foundation/KVURL.h>
 #include <korvane/foundation/KVUUID.h>
 #include <korvane/foundation/KVVersion.h>
+
+#include <korvane/platform/KVKeyedCoder.h>
+#include <korvane/platform/NSCoder.h>
+#include <korvane/platform/NSError.h>
