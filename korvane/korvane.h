@@ -41,3 +41,6 @@
 #include <korvane/serialization/KVSerializerWriteStream.h>
 #include <korvane/serialization/KVStream.h>
 #include <korvane/serialization/KVStreamElement.h>
+#include <korvane/platform/KVKeyedCoder.h>
+#include <korvane/platform/NSCoder.h>
+#include <korvane/platform/NSError.h>
