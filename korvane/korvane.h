@@ -41,3 +41,7 @@
 #include <korvane/serialization/KVSerializerWriteStream.h>
 #include <korvane/serialization/KVStream.h>
 #include <korvane/serialization/KVStreamElement.h>
+#include <korvane/cache/KVCache.h>
+#include <korvane/cache/KVCacheImpl.h>
+#include <korvane/cache/KVCachedFunctionImpl.h>
+#include <korvane/cache/KVEvictionHeap.h>
