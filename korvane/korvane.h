@@ -44,3 +44,7 @@
 #include <korvane/platform/KVKeyedCoder.h>
 #include <korvane/platform/NSCoder.h>
 #include <korvane/platform/NSError.h>
+#include <korvane/cache/KVCache.h>
+#include <korvane/cache/KVCacheImpl.h>
+#include <korvane/cache/KVCachedFunctionImpl.h>
+#include <korvane/cache/KVEvictionHeap.h>
