@@ -131,9 +131,9 @@ void KVFileWriteStream::File::close()
 {
     if (closed)
         return;
+    closed = true;
     if (error == 0)
         flush();
-    closed = true;
     int const closing = descriptor.close();
     if (error == 0)
         error = closing;
