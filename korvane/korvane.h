@@ -34,6 +34,12 @@
 #include <korvane/foundation/KVUUID.h>
 #include <korvane/foundation/KVVersion.h>
 
+#include <korvane/serialization/KVAsciiStream.h>
+#include <korvane/serialization/KVBufferReadStream.h>
+#include <korvane/serialization/KVBufferWriteStream.h>
+#include <korvane/serialization/KVByteWriteStream.h>
+#include <korvane/serialization/KVFileReadStream.h>
+#include <korvane/serialization/KVFileWriteStream.h>
 #include <korvane/serialization/KVIgnoreElement.h>
 #include <korvane/serialization/KVScope.h>
 #include <korvane/serialization/KVSerializer.h>
