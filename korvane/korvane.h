@@ -28,3 +28,6 @@
 #include <korvane/foundation/KVURL.h>
 #include <korvane/foundation/KVUUID.h>
 #include <korvane/foundation/KVVersion.h>
+
+#include <korvane/serialization/KVHash128.h>
+#include <korvane/serialization/KVMD5.h>
