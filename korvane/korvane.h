@@ -20,14 +20,26 @@
 #include <korvane/foundation/KVException.h>
 #include <korvane/foundation/KVExport.h>
 #include <korvane/foundation/KVInfo.h>
+#include <korvane/foundation/KVMutex.h>
 #include <korvane/foundation/KVNSRef.h>
 #include <korvane/foundation/KVPrint.h>
 #include <korvane/foundation/KVShared.h>
+#include <korvane/foundation/KVSharedMutex.h>
+#include <korvane/foundation/KVSingleton.h>
+#include <korvane/foundation/KVSpinLock.h>
 #include <korvane/foundation/KVStackTrace.h>
 #include <korvane/foundation/KVString.h>
+#include <korvane/foundation/KVThread.h>
 #include <korvane/foundation/KVURL.h>
 #include <korvane/foundation/KVUUID.h>
 #include <korvane/foundation/KVVersion.h>
 
 #include <korvane/serialization/KVHash128.h>
+#include <korvane/serialization/KVIgnoreElement.h>
 #include <korvane/serialization/KVMD5.h>
+#include <korvane/serialization/KVScope.h>
+#include <korvane/serialization/KVSerializer.h>
+#include <korvane/serialization/KVSerializerReadStream.h>
+#include <korvane/serialization/KVSerializerWriteStream.h>
+#include <korvane/serialization/KVStream.h>
+#include <korvane/serialization/KVStreamElement.h>

@@ -1,0 +1,44 @@
+#pragma once
+
+#include <korvane/foundation/KVExport.h>
+
+#include <pthread.h>
+
+/// A handle on one thread, which runs from the moment that the handle is made.
+///
+///     KVThread worker(&run, &job, "decode");
+///     worker.wait();
+///
+/// `wait` or `detach` once; a handle that goes while its thread is attached detaches it.
+class KV_EXPORT KVThread {
+public:
+    /// `name` may be null; the system keeps up to 15 bytes of it. Throws KVSystemException if the
+    /// thread cannot be started.
+    KVThread(void (*function)(void*), void* argument, char const* name);
+    KVThread(KVThread const&) = delete;
+    KVThread& operator=(KVThread const&) = delete;
+    ~KVThread();
+
+    /// Asks the thread to end at its next cancellation point (POSIX).
+    void cancel() noexcept;
+    /// Waits for the end of the thread.
+    void wait() noexcept;
+    /// Lets the thread go on alone.
+    void detach() noexcept;
+    /// The calling thread.
+    static pthread_t self() noexcept { return ::pthread_self(); }
+    /// Whether this handle's thread is the calling one.
+    bool isSelf() const noexcept { return ::pthread_equal(thread_, ::pthread_self()) != 0; }
+    bool operator==(KVThread const& other) const noexcept
+    {
+        return ::pthread_equal(thread_, other.thread_) != 0;
+    }
+
+    /// Runs `function(argument, index, count)` once for each index from 0, on as many threads as
+    /// there are processors, and waits for all of them. The function must not throw.
+    static void KVFork(void (*function)(void*, int, int), void* argument);
+
+private:
+    pthread_t thread_{};
+    bool attached_ = false;
+};
