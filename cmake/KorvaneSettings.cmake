@@ -53,6 +53,10 @@ endif()
 if(KORVANE_SANITIZE)
   add_compile_options(-fsanitize=${KORVANE_SANITIZE} -fno-omit-frame-pointer
                       -fno-sanitize-recover=all)
+  if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+    # The sanitizers' own code hides from g++ what is set where.
+    add_compile_options(-Wno-maybe-uninitialized)
+  endif()
   add_link_options(-fsanitize=${KORVANE_SANITIZE})
 endif()
 if(KORVANE_COVERAGE)
