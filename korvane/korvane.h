@@ -40,7 +40,9 @@
 #include <korvane/serialization/KVByteWriteStream.h>
 #include <korvane/serialization/KVFileReadStream.h>
 #include <korvane/serialization/KVFileWriteStream.h>
+#include <korvane/serialization/KVHash128.h>
 #include <korvane/serialization/KVIgnoreElement.h>
+#include <korvane/serialization/KVMD5.h>
 #include <korvane/serialization/KVScope.h>
 #include <korvane/serialization/KVSerializer.h>
 #include <korvane/serialization/KVSerializerReadStream.h>
