@@ -11,6 +11,7 @@
 #include <korvane/platform/CFString.h>
 #include <korvane/platform/CFURL.h>
 #include <korvane/platform/CMTime.h>
+#include <korvane/platform/CMTimeRange.h>
 #include <korvane/platform/NSObject.h>
 #include <korvane/platform/NSRange.h>
 
@@ -41,3 +42,7 @@
 #include <korvane/serialization/KVSerializerWriteStream.h>
 #include <korvane/serialization/KVStream.h>
 #include <korvane/serialization/KVStreamElement.h>
+
+#include <korvane/time/IntermediateLargeInteger.h>
+#include <korvane/time/KVTime.h>
+#include <korvane/time/KVTimeRange.h>
