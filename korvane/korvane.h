@@ -11,6 +11,7 @@
 #include <korvane/platform/CFString.h>
 #include <korvane/platform/CFURL.h>
 #include <korvane/platform/CMTime.h>
+#include <korvane/platform/CMTimeRange.h>
 #include <korvane/platform/NSObject.h>
 #include <korvane/platform/NSRange.h>
 
@@ -57,3 +58,7 @@
 #include <korvane/cache/KVCacheImpl.h>
 #include <korvane/cache/KVCachedFunctionImpl.h>
 #include <korvane/cache/KVEvictionHeap.h>
+
+#include <korvane/time/IntermediateLargeInteger.h>
+#include <korvane/time/KVTime.h>
+#include <korvane/time/KVTimeRange.h>
