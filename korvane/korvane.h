@@ -35,6 +35,7 @@
 #include <korvane/foundation/KVVersion.h>
 
 #include <korvane/serialization/KVHash128.h>
+#include <korvane/serialization/KVHashWriteStream.h>
 #include <korvane/serialization/KVIgnoreElement.h>
 #include <korvane/serialization/KVMD5.h>
 #include <korvane/serialization/KVScope.h>
