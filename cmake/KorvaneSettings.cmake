@@ -13,8 +13,19 @@ if(NOT CMAKE_BUILD_TYPE AND NOT CMAKE_CONFIGURATION_TYPES)
 endif()
 
 find_program(CCACHE_PROGRAM ccache)
+mark_as_advanced(CCACHE_PROGRAM)
 if(CCACHE_PROGRAM AND NOT CMAKE_CXX_COMPILER_LAUNCHER)
   set(CMAKE_CXX_COMPILER_LAUNCHER "${CCACHE_PROGRAM}")
+endif()
+
+# A faster linker where there is one.
+find_program(MOLD_PROGRAM mold)
+find_program(LLD_PROGRAM ld.lld)
+mark_as_advanced(MOLD_PROGRAM LLD_PROGRAM)
+if(MOLD_PROGRAM)
+  add_link_options(-fuse-ld=mold)
+elseif(LLD_PROGRAM)
+  add_link_options(-fuse-ld=lld)
 endif()
 
 # The results of floating-point code are part of the interface: no fused
@@ -25,9 +36,23 @@ add_compile_options(-Wall -Wextra -Wpedantic -Wshadow -Wnon-virtual-dtor
 if(KORVANE_DEVELOPER)
   add_compile_options(-Werror)
 endif()
+
+if(KORVANE_FUZZ)
+  if(NOT CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
+    message(FATAL_ERROR "KORVANE_FUZZ needs clang, for its libFuzzer: -DCMAKE_CXX_COMPILER=clang++")
+  endif()
+  add_compile_options(-fsanitize=fuzzer-no-link)
+  if(NOT KORVANE_SANITIZE)
+    set(KORVANE_SANITIZE "address,undefined")
+  endif()
+endif()
 if(KORVANE_SANITIZE)
   add_compile_options(-fsanitize=${KORVANE_SANITIZE} -fno-omit-frame-pointer
                       -fno-sanitize-recover=all)
   add_link_options(-fsanitize=${KORVANE_SANITIZE})
+endif()
+if(KORVANE_COVERAGE)
+  add_compile_options(--coverage -fprofile-update=atomic)
+  add_link_options(--coverage)
 endif()
 add_link_options(-Wl,--as-needed)

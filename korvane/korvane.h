@@ -34,6 +34,12 @@
 #include <korvane/foundation/KVUUID.h>
 #include <korvane/foundation/KVVersion.h>
 
+#include <korvane/serialization/KVAsciiStream.h>
+#include <korvane/serialization/KVBufferReadStream.h>
+#include <korvane/serialization/KVBufferWriteStream.h>
+#include <korvane/serialization/KVByteWriteStream.h>
+#include <korvane/serialization/KVFileReadStream.h>
+#include <korvane/serialization/KVFileWriteStream.h>
 #include <korvane/serialization/KVHash128.h>
 #include <korvane/serialization/KVHashWriteStream.h>
 #include <korvane/serialization/KVIgnoreElement.h>
@@ -44,3 +50,10 @@
 #include <korvane/serialization/KVSerializerWriteStream.h>
 #include <korvane/serialization/KVStream.h>
 #include <korvane/serialization/KVStreamElement.h>
+#include <korvane/platform/KVKeyedCoder.h>
+#include <korvane/platform/NSCoder.h>
+#include <korvane/platform/NSError.h>
+#include <korvane/cache/KVCache.h>
+#include <korvane/cache/KVCacheImpl.h>
+#include <korvane/cache/KVCachedFunctionImpl.h>
+#include <korvane/cache/KVEvictionHeap.h>
