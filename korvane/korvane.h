@@ -42,6 +42,7 @@
 #include <korvane/serialization/KVFileReadStream.h>
 #include <korvane/serialization/KVFileWriteStream.h>
 #include <korvane/serialization/KVHash128.h>
+#include <korvane/serialization/KVHashWriteStream.h>
 #include <korvane/serialization/KVIgnoreElement.h>
 #include <korvane/serialization/KVMD5.h>
 #include <korvane/serialization/KVScope.h>
