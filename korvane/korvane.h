@@ -35,6 +35,13 @@
 #include <korvane/foundation/KVUUID.h>
 #include <korvane/foundation/KVVersion.h>
 
+#include <korvane/cache/KVCache.h>
+#include <korvane/cache/KVCacheImpl.h>
+#include <korvane/cache/KVCachedFunctionImpl.h>
+#include <korvane/cache/KVEvictionHeap.h>
+#include <korvane/platform/KVKeyedCoder.h>
+#include <korvane/platform/NSCoder.h>
+#include <korvane/platform/NSError.h>
 #include <korvane/serialization/KVAsciiStream.h>
 #include <korvane/serialization/KVBufferReadStream.h>
 #include <korvane/serialization/KVBufferWriteStream.h>
