@@ -21,8 +21,7 @@ class KV_EXPORT KVMatrix33Tmpl {
 public:
     constexpr KVMatrix33Tmpl() noexcept : values_{1, 0, 0, 0, 1, 0, 0, 0, 1} {}
     /// Nine elements, row by row.
-    constexpr explicit KVMatrix33Tmpl(std::array<T, 9> const& rowMajor) noexcept :
-        values_(rowMajor)
+    constexpr explicit KVMatrix33Tmpl(std::array<T, 9> const& rowMajor) noexcept : values_(rowMajor)
     {}
 
     /// Rows and columns 0 to 2; an index outside them is undefined.
@@ -44,9 +43,9 @@ public:
     }
     void transpose() noexcept;
     T determinant() const noexcept;
-    /// Becomes the inverse of `source`, which may be this, by the adjugate. Answers false and leaves
-    /// this unchanged if the determinant is 0 or its absolute value below `tolerance`; one that is
-    /// not a number is neither.
+    /// Becomes the inverse of `source`, which may be this, by the adjugate. Answers false and
+    /// leaves this unchanged if the determinant is 0 or its absolute value below `tolerance`; one
+    /// that is not a number is neither.
     bool invert(KVMatrix33Tmpl const& source, double tolerance = 0) noexcept;
 
 private:

@@ -194,7 +194,8 @@ void KVMatrix44Tmpl<T>::setTransformation(KVMatrix44Parameters<T> const& paramet
     for (int const about : orderOf(parameters).applied)
         leftRotate(angles[about], static_cast<axis>(about));
     for (int col = 0; col < 3; ++col)
-        (*this)(2, col) += parameters.shear.x * (*this)(0, col) + parameters.shear.y * (*this)(1, col);
+        (*this)(2, col) +=
+            parameters.shear.x * (*this)(0, col) + parameters.shear.y * (*this)(1, col);
     leftScale(parameters.scale.x, parameters.scale.y, parameters.scale.z);
     leftTranslate(parameters.translation.x, parameters.translation.y, parameters.translation.z);
 }

@@ -94,8 +94,7 @@ std::string descriptionOf(Matrix const& matrix)
 } // namespace
 
 NSCodingClass const KVMatrix44Double::coding{
-    "KVMatrix44Double",
-    [](NSCoder& coder) -> KVNSRef<NSObject*> { return initWithCoder(coder); }};
+    "KVMatrix44Double", [](NSCoder& coder) -> KVNSRef<NSObject*> { return initWithCoder(coder); }};
 
 KVMatrix44Double::KVMatrix44Double(double const* doubles, bool) noexcept
 {
@@ -114,12 +113,12 @@ KVMatrix44Double::KVMatrix44Double(CFArrayRef numbers)
     }
 }
 
-KVMatrix44Double::KVMatrix44Double(simd_float4x4 const& columns) noexcept :
-    matrix_(fromColumns(columns))
+KVMatrix44Double::KVMatrix44Double(simd_float4x4 const& columns) noexcept
+    : matrix_(fromColumns(columns))
 {}
 
-KVMatrix44Double::KVMatrix44Double(simd_double4x4 const& columns) noexcept :
-    matrix_(fromColumns(columns))
+KVMatrix44Double::KVMatrix44Double(simd_double4x4 const& columns) noexcept
+    : matrix_(fromColumns(columns))
 {}
 
 KVNSRef<KVMatrix44Double*> KVMatrix44Double::matrixWithSIMDFloat4x4(simd_float4x4 const& columns)
@@ -201,10 +200,10 @@ KVString KVMatrix44Double::extendedDescription(KVMatrix44Double const* matrix)
         indented += c == '\n' ? std::string("\n\t") : std::string(1, c);
     return "translation:" + line('x', info.translationX) + line('y', info.translationY) +
            line('z', info.translationZ) + "\nscale:" + line('x', info.scaleX) +
-           line('y', info.scaleY) + line('z', info.scaleZ) + "\nrotation:" +
-           turn('x', info.rotationX) + turn('y', info.rotationY) + turn('z', info.rotationZ) +
-           "\nshear:" + line('x', info.shearX) + line('y', info.shearY) + "\nmatrix:\n\t" +
-           indented;
+           line('y', info.scaleY) + line('z', info.scaleZ) +
+           "\nrotation:" + turn('x', info.rotationX) + turn('y', info.rotationY) +
+           turn('z', info.rotationZ) + "\nshear:" + line('x', info.shearX) +
+           line('y', info.shearY) + "\nmatrix:\n\t" + indented;
 }
 
 KVString KVMatrix44Double::debugDescription() const

@@ -8,8 +8,8 @@
 #include <korvane/platform/NSCoder.h>
 #include <korvane/platform/simd.h>
 
-/// What a transform does, by axis; that of the identity until it is filled. Rotations are in radians,
-/// applied about z, then x, then y.
+/// What a transform does, by axis; that of the identity until it is filled. Rotations are in
+/// radians, applied about z, then x, then y.
 struct KVMatrix44TransformInfo {
     double translationX = 0, translationY = 0, translationZ = 0;
     double rotationX = 0, rotationY = 0, rotationZ = 0;
@@ -17,7 +17,8 @@ struct KVMatrix44TransformInfo {
     double shearX = 0, shearY = 0;
 };
 
-/// A KVMatrix44Tmpl<double> as an object: shared by reference, archived, printed and edited in place.
+/// A KVMatrix44Tmpl<double> as an object: shared by reference, archived, printed and edited in
+/// place.
 ///
 ///     auto camera = KVMakeRef<KVMatrix44Double>();
 ///     camera->leftRotate(std::numbers::pi / 2, KVMatrix44Tmpl<double>::zAxis);
@@ -37,8 +38,8 @@ public:
     explicit KVMatrix44Double(Matrix const& matrix) noexcept : matrix_(matrix) {}
     /// Copies the doubles, whatever `external` says.
     explicit KVMatrix44Double(double const* doubles, bool external = false) noexcept;
-    /// From the first sixteen numbers of the array. Throws KVBadIndexException if there are fewer, or
-    /// no array, and KVIllegalArgumentException if one is not a number.
+    /// From the first sixteen numbers of the array. Throws KVBadIndexException if there are fewer,
+    /// or no array, and KVIllegalArgumentException if one is not a number.
     explicit KVMatrix44Double(CFArrayRef numbers);
     explicit KVMatrix44Double(simd_float4x4 const& columns) noexcept;
     explicit KVMatrix44Double(simd_double4x4 const& columns) noexcept;
@@ -47,8 +48,8 @@ public:
 
     // --- Archive ---
 
-    /// The archive holds one block under the key "bytes": the doubles in the machine's byte order, 128
-    /// bytes.
+    /// The archive holds one block under the key "bytes": the doubles in the machine's byte order,
+    /// 128 bytes.
     static NSCodingClass const coding;
     static constexpr bool supportsSecureCoding() noexcept { return true; }
     /// Null unless the coder has a block of 128 bytes or more, of which it takes the first 128.
@@ -88,8 +89,8 @@ public:
     Matrix* kvMatrix() noexcept { return &matrix_; }
     Matrix const* kvMatrix() const noexcept { return &matrix_; }
 
-    /// Element row * 4 + col, whatever the two are apart; throws KVBadIndexException if that is not one
-    /// of 0 to 15.
+    /// Element row * 4 + col, whatever the two are apart; throws KVBadIndexException if that is not
+    /// one of 0 to 15.
     double doubleValueAtRow(int row, int col) const;
     void setDoubleValue(double value, int row, int col);
     void getDoubles(double* doubles) const noexcept;
@@ -113,34 +114,38 @@ public:
     void leftShearX(double x, double y) noexcept { matrix_.leftShear(x, y); }
     void rightShearX(double x, double y) noexcept { matrix_.rightShear(x, y); }
     void leftRotate(double angle, Matrix::axis about) noexcept { matrix_.leftRotate(angle, about); }
-    void rightRotate(double angle, Matrix::axis about) noexcept { matrix_.rightRotate(angle, about); }
+    void rightRotate(double angle, Matrix::axis about) noexcept
+    {
+        matrix_.rightRotate(angle, about);
+    }
     bool invert() noexcept { return matrix_.invert(matrix_); }
     /// The inverse in the plane z = 0.
     bool invert2D() noexcept { return matrix_.planarInverseZ(matrix_); }
     void transpose() noexcept { matrix_.transpose(); }
     void leftMult(KVMatrix44Double const& a) noexcept { matrix_.leftMult(a.matrix_); }
     void rightMult(KVMatrix44Double const& a) noexcept { matrix_.rightMult(a.matrix_); }
-    /// Mirrors the result in the line at height y: translates by -y, scales y by -1, translates by y.
+    /// Mirrors the result in the line at height y: translates by -y, scales y by -1, translates by
+    /// y.
     void leftFlipAboutY(double y) noexcept;
 
     // --- Use ---
 
-    /// The bounds of the transformed rectangle; empty for an empty one and for one that reaches behind
-    /// the eye.
+    /// The bounds of the transformed rectangle; empty for an empty one and for one that reaches
+    /// behind the eye.
     KVRect<double> transformRect(KVRect<double> const& rect) const noexcept;
     /// Divided by w, without any test of it.
     KVVector2<double> transformPoint(KVVector2<double> const& point) const noexcept;
     /// As `getTransformation` tells; that of the identity if the matrix cannot be taken apart.
     KVMatrix44TransformInfo transformInfo() const noexcept;
-    /// Writes each size times the scale of its axis to the output, null for none. Answers false if the
-    /// matrix cannot be taken apart; its scales then count as 1.
+    /// Writes each size times the scale of its axis to the output, null for none. Answers false if
+    /// the matrix cannot be taken apart; its scales then count as 1.
     bool scaleSizeX(double sizeX, double sizeY, double sizeZ, double* scaledSizeX,
                     double* scaledSizeY, double* scaledSizeZ) const noexcept;
     /// m(0,0), m(0,1), m(1,0), m(1,1), m(0,3), m(1,3) as m11, m12, m21, m22, tX, tY. They are not
     /// transposed, though this matrix acts on columns and that one on rows; that is meant.
     NSAffineTransform newNSAffineTransform() const noexcept;
-    /// What takes this transform's result to the other's: other * inverse of this. The identity if the
-    /// other is null or equal; where this has no inverse, other * this.
+    /// What takes this transform's result to the other's: other * inverse of this. The identity if
+    /// the other is null or equal; where this has no inverse, other * this.
     KVNSRef<KVMatrix44Double*> newTransformTo(KVMatrix44Double const* other) const;
     /// The same with the inverse in the plane z = 0.
     KVNSRef<KVMatrix44Double*> newPlanarTransformTo(KVMatrix44Double const* other) const;

@@ -17,9 +17,9 @@ Matrix jacobianAt(Matrix const& matrix, Vector const& point)
 Vector scaleOf(Matrix const& jacobian, Vector const& size, bool flip)
 {
     auto const column = [&](int i) {
-        double const length = Vector(jacobian(0, i) * size.x, jacobian(1, i) * size.y,
-                                     jacobian(2, i) * size.z)
-                                  .length();
+        double const length =
+            Vector(jacobian(0, i) * size.x, jacobian(1, i) * size.y, jacobian(2, i) * size.z)
+                .length();
         return flip && jacobian(i, i) < 0 ? -length : length;
     };
     return {column(0), column(1), column(2)};

@@ -97,8 +97,8 @@ double shearFactor(double angle) noexcept
     return std::tan(angle);
 }
 
-/// The two rows or columns, in cyclic order, that a rotation about an axis combines: those of y and z
-/// for x, of z and x for y, of x and y for z.
+/// The two rows or columns, in cyclic order, that a rotation about an axis combines: those of y and
+/// z for x, of z and x for y, of x and y for z.
 struct Plane {
     int first;
     int second;
@@ -108,13 +108,13 @@ constexpr Plane planes[] = {{1, 2}, {2, 0}, {0, 1}};
 /// The six 2x2 minors of two rows, by their columns.
 template <class T>
 struct Minors {
-    Minors(T const* a, T const* b) noexcept :
-        m01(a[0] * b[1] - a[1] * b[0]),
-        m02(a[0] * b[2] - a[2] * b[0]),
-        m03(a[0] * b[3] - a[3] * b[0]),
-        m12(a[1] * b[2] - a[2] * b[1]),
-        m13(a[1] * b[3] - a[3] * b[1]),
-        m23(a[2] * b[3] - a[3] * b[2])
+    Minors(T const* a, T const* b) noexcept
+        : m01(a[0] * b[1] - a[1] * b[0]),
+          m02(a[0] * b[2] - a[2] * b[0]),
+          m03(a[0] * b[3] - a[3] * b[0]),
+          m12(a[1] * b[2] - a[2] * b[1]),
+          m13(a[1] * b[3] - a[3] * b[1]),
+          m23(a[2] * b[3] - a[3] * b[2])
     {}
     /// The determinant of the matrix with `upper` above these two rows.
     T determinantBelow(Minors const& upper) const noexcept
@@ -365,8 +365,7 @@ KVMatrix44Tmpl<T> KVMatrix44Tmpl<T>::jacobianPost(KVVector4<T> const& p) const n
     T const square = p.w * p.w;
     for (int row = 0; row < 3; ++row)
         for (int col = 0; col < 3; ++col)
-            jacobian(row, col) =
-                (p.w * (*this)(row, col) - point[row] * (*this)(3, col)) / square;
+            jacobian(row, col) = (p.w * (*this)(row, col) - point[row] * (*this)(3, col)) / square;
     return jacobian;
 }
 

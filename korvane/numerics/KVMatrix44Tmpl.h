@@ -23,8 +23,8 @@
 ///          | 0  s  c |        | -s  0  c |        | 0  0  1 |
 ///
 /// The editing members work in place. `left...` puts its operation on the left, so that it acts
-/// after what the matrix did so far, `right...` on the right, so that it acts before. Each skips its
-/// work for the neutral argument: 0 for a translation or an angle, 1 for a scale.
+/// after what the matrix did so far, `right...` on the right, so that it acts before. Each skips
+/// its work for the neutral argument: 0 for a translation or an angle, 1 for a scale.
 ///
 ///     KVMatrix44Tmpl<double> m;
 ///     m.leftScale(2, 2, 1);
@@ -42,8 +42,8 @@ public:
 
     constexpr KVMatrix44Tmpl() noexcept : values_{1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1} {}
     /// Sixteen elements, row by row.
-    constexpr explicit KVMatrix44Tmpl(std::array<T, 16> const& rowMajor) noexcept :
-        values_(rowMajor)
+    constexpr explicit KVMatrix44Tmpl(std::array<T, 16> const& rowMajor) noexcept
+        : values_(rowMajor)
     {}
 
     /// Rows and columns 0 to 3; an index outside them is undefined.
@@ -77,22 +77,22 @@ public:
     void rightScale(T x, T y, T z) noexcept;
     /// Multiplies by the matrix H with the rows (1, tan a), (tan b, 1) in its upper left corner. An
     /// angle is first brought into 0 to pi; one within 0.3 degrees of a right angle is taken as
-    /// 1.5655603390389135, the right angle less 0.3 degrees. An angle that is not finite has a tangent
-    /// that is not a number.
+    /// 1.5655603390389135, the right angle less 0.3 degrees. An angle that is not finite has a
+    /// tangent that is not a number.
     void leftShear(double a, double b) noexcept;
     void rightShear(double a, double b) noexcept;
-    /// Multiplies by Rx, Ry or Rz. An angle closer than 1e-7 to pi/2, pi or 3 pi/2, or to the negative
-    /// of one, has a sine and cosine of exactly 0, 1 and -1. An axis outside 0 to 2 leaves the matrix
-    /// alone.
+    /// Multiplies by Rx, Ry or Rz. An angle closer than 1e-7 to pi/2, pi or 3 pi/2, or to the
+    /// negative of one, has a sine and cosine of exactly 0, 1 and -1. An axis outside 0 to 2 leaves
+    /// the matrix alone.
     void leftRotate(double angle, axis about) noexcept;
     void rightRotate(double angle, axis about) noexcept;
     void transpose() noexcept;
 
     // --- Invert ---
 
-    /// Becomes the inverse of `source`, which may be this, by the adjugate. Answers false and leaves
-    /// this unchanged if the determinant is 0 or its absolute value below `tolerance`; one that is
-    /// not a number is neither, and gives a matrix of such.
+    /// Becomes the inverse of `source`, which may be this, by the adjugate. Answers false and
+    /// leaves this unchanged if the determinant is 0 or its absolute value below `tolerance`; one
+    /// that is not a number is neither, and gives a matrix of such.
     bool invert(KVMatrix44Tmpl const& source, double tolerance = 0) noexcept;
     /// The inverse in the plane z = 0: inverts rows and columns 0, 1 and 3 of `source`, as `invert`
     /// does, and makes row 2 and column 2 zero, m(2,2) as well, so that the result flattens z.
@@ -154,23 +154,24 @@ public:
     /// mirror turns the sign of all three scales.
     ///
     /// Writes translation, scale and shear into `parameters` and the 3x3 part of Rotation into
-    /// `rotation`, whose fourth row and column it leaves alone. Answers false, with nothing written,
-    /// if m(3,3) is 0 or the 3x3 part singular.
+    /// `rotation`, whose fourth row and column it leaves alone. Answers false, with nothing
+    /// written, if m(3,3) is 0 or the 3x3 part singular.
     bool getPartialTransformation(KVMatrix44Parameters<T>& parameters,
                                   KVMatrix44Tmpl& rotation) const noexcept;
     /// The same with Rotation as three angles, in the order that `parameters.rotOrder` asks for; an
     /// order outside 0 to 5 prints "bad rotOrder" and aborts the process, once all else succeeded.
     ///
-    /// The angle of the axis that is applied second is an arc sine, not clamped: an entry that rounding
-    /// pushed beyond 1 makes it not a number. Where the cosine of that angle is closer than 1e-7 to 0
-    /// (gimbal lock) one of the others can be chosen: it is 0, y in the orders 1 and 3, z in the rest.
+    /// The angle of the axis that is applied second is an arc sine, not clamped: an entry that
+    /// rounding pushed beyond 1 makes it not a number. Where the cosine of that angle is closer
+    /// than 1e-7 to 0 (gimbal lock) one of the others can be chosen: it is 0, y in the orders 1 and
+    /// 3, z in the rest.
     bool getTransformation(KVMatrix44Parameters<T>& parameters) const;
-    /// The same with Rotation as a quaternion; the angles of `parameters` are left alone. A half turn's
-    /// axis has no negative components.
+    /// The same with Rotation as a quaternion; the angles of `parameters` are left alone. A half
+    /// turn's axis has no negative components.
     bool getTransformation(KVMatrix44Parameters<T>& parameters,
                            KVQuat<T>& quaternion) const noexcept;
-    /// Becomes Translation * Scale and shear * Rotation: the reverse of `getTransformation`. Aborts in
-    /// the same way for a bad `rotOrder`.
+    /// Becomes Translation * Scale and shear * Rotation: the reverse of `getTransformation`. Aborts
+    /// in the same way for a bad `rotOrder`.
     void setTransformation(KVMatrix44Parameters<T> const& parameters);
 
 private:

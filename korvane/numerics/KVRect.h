@@ -17,8 +17,8 @@ struct KVRect {
     T height = -1;
 
     constexpr KVRect() noexcept = default;
-    constexpr KVRect(T xValue, T yValue, T widthValue, T heightValue) noexcept :
-        x(xValue), y(yValue), width(widthValue), height(heightValue)
+    constexpr KVRect(T xValue, T yValue, T widthValue, T heightValue) noexcept
+        : x(xValue), y(yValue), width(widthValue), height(heightValue)
     {}
 
     constexpr bool isEmpty() const noexcept { return width < 0 || height < 0; }

@@ -16,8 +16,8 @@ struct KVVector2 {
     constexpr KVVector2(T xValue, T yValue) noexcept : x(xValue), y(yValue) {}
     /// From the other precision.
     template <class U>
-    constexpr explicit KVVector2(KVVector2<U> const& other) noexcept :
-        x(static_cast<T>(other.x)), y(static_cast<T>(other.y))
+    constexpr explicit KVVector2(KVVector2<U> const& other) noexcept
+        : x(static_cast<T>(other.x)), y(static_cast<T>(other.y))
     {}
 
     constexpr KVVector2& operator+=(KVVector2 const& v) noexcept { return *this = *this + v; }

@@ -16,8 +16,8 @@ struct KVVector3 {
     constexpr KVVector3(T xValue, T yValue, T zValue) noexcept : x(xValue), y(yValue), z(zValue) {}
     /// From the other precision.
     template <class U>
-    constexpr explicit KVVector3(KVVector3<U> const& other) noexcept :
-        x(static_cast<T>(other.x)), y(static_cast<T>(other.y)), z(static_cast<T>(other.z))
+    constexpr explicit KVVector3(KVVector3<U> const& other) noexcept
+        : x(static_cast<T>(other.x)), y(static_cast<T>(other.y)), z(static_cast<T>(other.z))
     {}
 
     constexpr KVVector3& operator+=(KVVector3 const& v) noexcept { return *this = *this + v; }

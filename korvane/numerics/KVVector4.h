@@ -12,19 +12,19 @@ struct KVVector4 {
     T w = 0;
 
     constexpr KVVector4() noexcept = default;
-    constexpr KVVector4(T xValue, T yValue, T zValue, T wValue) noexcept :
-        x(xValue), y(yValue), z(zValue), w(wValue)
+    constexpr KVVector4(T xValue, T yValue, T zValue, T wValue) noexcept
+        : x(xValue), y(yValue), z(zValue), w(wValue)
     {}
-    constexpr KVVector4(KVVector3<T> const& v, T wValue) noexcept :
-        x(v.x), y(v.y), z(v.z), w(wValue)
+    constexpr KVVector4(KVVector3<T> const& v, T wValue) noexcept
+        : x(v.x), y(v.y), z(v.z), w(wValue)
     {}
     /// From the other precision.
     template <class U>
-    constexpr explicit KVVector4(KVVector4<U> const& other) noexcept :
-        x(static_cast<T>(other.x)),
-        y(static_cast<T>(other.y)),
-        z(static_cast<T>(other.z)),
-        w(static_cast<T>(other.w))
+    constexpr explicit KVVector4(KVVector4<U> const& other) noexcept
+        : x(static_cast<T>(other.x)),
+          y(static_cast<T>(other.y)),
+          z(static_cast<T>(other.z)),
+          w(static_cast<T>(other.w))
     {}
 
     constexpr KVVector4& operator+=(KVVector4 const& v) noexcept { return *this = *this + v; }
