@@ -12,8 +12,10 @@
 #include <korvane/platform/CFURL.h>
 #include <korvane/platform/CMTime.h>
 #include <korvane/platform/CMTimeRange.h>
+#include <korvane/platform/NSAffineTransform.h>
 #include <korvane/platform/NSObject.h>
 #include <korvane/platform/NSRange.h>
+#include <korvane/platform/simd.h>
 
 #include <korvane/foundation/KVArray.h>
 #include <korvane/foundation/KVCFRef.h>
@@ -70,3 +72,14 @@
 #include <korvane/time/IntermediateLargeInteger.h>
 #include <korvane/time/KVTime.h>
 #include <korvane/time/KVTimeRange.h>
+
+#include <korvane/numerics/KVMatrix33Tmpl.h>
+#include <korvane/numerics/KVMatrix44Double.h>
+#include <korvane/numerics/KVMatrix44Measure.h>
+#include <korvane/numerics/KVMatrix44Parameters.h>
+#include <korvane/numerics/KVMatrix44Tmpl.h>
+#include <korvane/numerics/KVQuat.h>
+#include <korvane/numerics/KVRect.h>
+#include <korvane/numerics/KVVector2.h>
+#include <korvane/numerics/KVVector3.h>
+#include <korvane/numerics/KVVector4.h>
