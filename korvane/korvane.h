@@ -11,6 +11,7 @@
 #include <korvane/platform/CFString.h>
 #include <korvane/platform/CFURL.h>
 #include <korvane/platform/CMTime.h>
+#include <korvane/platform/CMTimeRange.h>
 #include <korvane/platform/NSObject.h>
 #include <korvane/platform/NSRange.h>
 
@@ -41,6 +42,7 @@
 #include <korvane/serialization/KVFileReadStream.h>
 #include <korvane/serialization/KVFileWriteStream.h>
 #include <korvane/serialization/KVHash128.h>
+#include <korvane/serialization/KVHashWriteStream.h>
 #include <korvane/serialization/KVIgnoreElement.h>
 #include <korvane/serialization/KVMD5.h>
 #include <korvane/serialization/KVScope.h>
@@ -59,3 +61,7 @@
 #include <korvane/cache/KVCacheImpl.h>
 #include <korvane/cache/KVCachedFunctionImpl.h>
 #include <korvane/cache/KVEvictionHeap.h>
+
+#include <korvane/time/IntermediateLargeInteger.h>
+#include <korvane/time/KVTime.h>
+#include <korvane/time/KVTimeRange.h>
