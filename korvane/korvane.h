@@ -60,6 +60,8 @@
 #include <korvane/serialization/KVSerializerWriteStream.h>
 #include <korvane/serialization/KVStream.h>
 #include <korvane/serialization/KVStreamElement.h>
+#include <korvane/serialization/KVXMLReadStream.h>
+#include <korvane/serialization/KVXMLStreamElement.h>
 #include <korvane/serialization/KVXMLWriteStream.h>
 #include <korvane/platform/KVKeyedCoder.h>
 #include <korvane/platform/NSCoder.h>
