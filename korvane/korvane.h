@@ -35,6 +35,10 @@
 #include <korvane/foundation/KVVersion.h>
 
 #include <korvane/serialization/KVAsciiStream.h>
+#include <korvane/serialization/KVBinaryXMLField.h>
+#include <korvane/serialization/KVBinaryXMLReadStream.h>
+#include <korvane/serialization/KVBinaryXMLStreamElement.h>
+#include <korvane/serialization/KVBinaryXMLWriteStream.h>
 #include <korvane/serialization/KVBufferReadStream.h>
 #include <korvane/serialization/KVBufferWriteStream.h>
 #include <korvane/serialization/KVByteWriteStream.h>
