@@ -33,6 +33,10 @@ endif()
 add_compile_options(-ffp-contract=off)
 add_compile_options(-Wall -Wextra -Wpedantic -Wshadow -Wnon-virtual-dtor
                     -Woverloaded-virtual -Wcast-qual -Wformat=2)
+if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU" AND CMAKE_CXX_COMPILER_VERSION VERSION_LESS 13)
+  # g++ 12 sees overlaps inside the standard library's strings where there are none.
+  add_compile_options(-Wno-restrict)
+endif()
 if(KORVANE_DEVELOPER)
   add_compile_options(-Werror)
 endif()

@@ -11,6 +11,7 @@
 #include <korvane/platform/CFString.h>
 #include <korvane/platform/CFURL.h>
 #include <korvane/platform/CMTime.h>
+#include <korvane/platform/CMTimeRange.h>
 #include <korvane/platform/NSObject.h>
 #include <korvane/platform/NSRange.h>
 
@@ -54,6 +55,7 @@
 #include <korvane/serialization/KVSerializerWriteStream.h>
 #include <korvane/serialization/KVStream.h>
 #include <korvane/serialization/KVStreamElement.h>
+#include <korvane/serialization/KVXMLWriteStream.h>
 #include <korvane/platform/KVKeyedCoder.h>
 #include <korvane/platform/NSCoder.h>
 #include <korvane/platform/NSError.h>
@@ -61,3 +63,7 @@
 #include <korvane/cache/KVCacheImpl.h>
 #include <korvane/cache/KVCachedFunctionImpl.h>
 #include <korvane/cache/KVEvictionHeap.h>
+
+#include <korvane/time/IntermediateLargeInteger.h>
+#include <korvane/time/KVTime.h>
+#include <korvane/time/KVTimeRange.h>
