@@ -46,7 +46,8 @@ public:
     /// -1 for a failure and after `abortParse`. Elements that a failure left open stay on the
     /// stack.
     int parseElement();
-    /// Both take effect when the next element starts.
+    /// Both take effect when the next element starts. Called from the `parseElement` of an element
+    /// that has children, that is the one behind its first child's start.
     void abortParse() override;
     void stopParse() override;
     /// Goes to the end of the current element.

@@ -8,8 +8,8 @@ using namespace std::string_literals;
 namespace {
 
 KVScope scope[] = {
-    {"scene", 1, 0},   {"name", 1, 2},    {"far", 1, 300},     {"node", 2, 0},
-    {"name", 2, 2},    {"wide", 5000, 0}, {"wide", 70000u, 0}, {nullptr, 0, 0},
+    {"scene", 1, 0}, {"name", 1, 2},    {"far", 1, 300},     {"node", 2, 0},
+    {"name", 2, 2},  {"wide", 5000, 0}, {"wide", 70000u, 0}, {nullptr, 0, 0},
 };
 
 std::string const header("VZBML 5.10\0", 11);
@@ -227,11 +227,12 @@ TEST(KVBinaryXMLWriteStream, WritesElementsWithTheirSizes)
              s.writeValue(1);
              s.endElement();
          },
-         "\1\x20\0\0\0\2\2\x08\7\xAC\2\x2B\1b"
+         "\1\x1E\0\0\0\2\2\x08\7\xAC\2\x2B\1b"
          "\0\2\7\0\0\0\1\2\x28\0\0\0\x3F"
          "\0\2\1\0\0\0\0"
          "\x81"s},
-        {"two values", [](auto& s) {
+        {"two values",
+         [](auto& s) {
              s.startElement(1);
              s.writeValue(1);
              s.writeValue(2);
@@ -301,8 +302,9 @@ TEST(KVBinaryXMLWriteStream, RefusesWhatHasNoName)
     });
     stream.pushScope(scope);
     stream.startElement(1);
-    EXPECT_EQ(printedBy([&] { EXPECT_THROW(stream.startElement(9), KVException_NoElementDefined); }),
-              "Token not defined in scope scene!\n");
+    EXPECT_EQ(
+        printedBy([&] { EXPECT_THROW(stream.startElement(9), KVException_NoElementDefined); }),
+        "Token not defined in scope scene!\n");
     silently([&] {
         EXPECT_THROW(stream.writeAttribute(9, 1), KVException_AttributeUndefined);
         EXPECT_THROW(stream.writeAttribute(9, KVString("a")), KVException_AttributeUndefined);
@@ -335,8 +337,8 @@ TEST(KVBinaryXMLWriteStream, PatchesSizesInAFile)
         stream.writeValue(-1);
         stream.endElement();
     }
-    EXPECT_EQ(contentsOf(path), header + "\1\x6E\xEA\0\0\0\0\2\x65\xEA\0\0\0\x2B\xE0\xD4\3"s +
-                                    text + "\x18\1");
+    EXPECT_EQ(contentsOf(path),
+              header + "\1\x6E\xEA\0\0\0\0\2\x65\xEA\0\0\0\x2B\xE0\xD4\3"s + text + "\x18\1");
     KVBufferWriteStream bytes(64, 64);
     EXPECT_TRUE(KVBinaryXMLWriteStream(bytes, 1, 0).getURL().isNull());
 }
