@@ -45,6 +45,10 @@
 #include <korvane/platform/NSCoder.h>
 #include <korvane/platform/NSError.h>
 #include <korvane/serialization/KVAsciiStream.h>
+#include <korvane/serialization/KVBinaryXMLField.h>
+#include <korvane/serialization/KVBinaryXMLReadStream.h>
+#include <korvane/serialization/KVBinaryXMLStreamElement.h>
+#include <korvane/serialization/KVBinaryXMLWriteStream.h>
 #include <korvane/serialization/KVBufferReadStream.h>
 #include <korvane/serialization/KVBufferWriteStream.h>
 #include <korvane/serialization/KVByteWriteStream.h>
