@@ -2,6 +2,7 @@
 
 /// Every public header of the library, floor by floor from the ground.
 
+#include <korvane/platform/AVCaption.h>
 #include <korvane/platform/CFArray.h>
 #include <korvane/platform/CFBase.h>
 #include <korvane/platform/CFBundle.h>
@@ -12,8 +13,12 @@
 #include <korvane/platform/CFURL.h>
 #include <korvane/platform/CMTime.h>
 #include <korvane/platform/CMTimeRange.h>
+#include <korvane/platform/NSAttributedString.h>
+#include <korvane/platform/NSColor.h>
+#include <korvane/platform/NSFont.h>
 #include <korvane/platform/NSObject.h>
 #include <korvane/platform/NSRange.h>
+#include <korvane/platform/NSStringFile.h>
 
 #include <korvane/foundation/KVArray.h>
 #include <korvane/foundation/KVCFRef.h>
