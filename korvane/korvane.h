@@ -68,3 +68,12 @@
 #include <korvane/time/IntermediateLargeInteger.h>
 #include <korvane/time/KVTime.h>
 #include <korvane/time/KVTimeRange.h>
+
+#include <korvane/captions/KVCaption.h>
+#include <korvane/captions/KVCaptionCEA608.h>
+#include <korvane/captions/KVCaptionSRT.h>
+#include <korvane/captions/KVCaptionText.h>
+#include <korvane/captions/KVCaptioniTT.h>
+#include <korvane/captions/KVMutableCaption.h>
+#include <korvane/captions/KVSRTCaptionsExporter.h>
+#include <korvane/captions/KVSRTCaptionsImporter.h>
