@@ -2,6 +2,7 @@
 
 /// Every public header of the library, floor by floor from the ground.
 
+#include <korvane/platform/AVCaption.h>
 #include <korvane/platform/CFArray.h>
 #include <korvane/platform/CFBase.h>
 #include <korvane/platform/CFBundle.h>
@@ -16,6 +17,12 @@
 #include <korvane/platform/NSObject.h>
 #include <korvane/platform/NSRange.h>
 #include <korvane/platform/simd.h>
+#include <korvane/platform/NSAttributedString.h>
+#include <korvane/platform/NSColor.h>
+#include <korvane/platform/NSFont.h>
+#include <korvane/platform/NSObject.h>
+#include <korvane/platform/NSRange.h>
+#include <korvane/platform/NSStringFile.h>
 
 #include <korvane/foundation/KVArray.h>
 #include <korvane/foundation/KVCFRef.h>
@@ -89,3 +96,11 @@
 #include <korvane/numerics/KVVector2.h>
 #include <korvane/numerics/KVVector3.h>
 #include <korvane/numerics/KVVector4.h>
+#include <korvane/captions/KVCaption.h>
+#include <korvane/captions/KVCaptionCEA608.h>
+#include <korvane/captions/KVCaptionSRT.h>
+#include <korvane/captions/KVCaptionText.h>
+#include <korvane/captions/KVCaptioniTT.h>
+#include <korvane/captions/KVMutableCaption.h>
+#include <korvane/captions/KVSRTCaptionsExporter.h>
+#include <korvane/captions/KVSRTCaptionsImporter.h>
