@@ -33,3 +33,9 @@
 #include <korvane/foundation/KVURL.h>
 #include <korvane/foundation/KVUUID.h>
 #include <korvane/foundation/KVVersion.h>
+
+#include <korvane/media/KVAtomBox.h>
+#include <korvane/media/KVAtomBoxFile.h>
+#include <korvane/media/KVAtomMetadataHandler.h>
+#include <korvane/media/KVImageDescAtomBox.h>
+#include <korvane/media/KVXMPStringParser.h>
