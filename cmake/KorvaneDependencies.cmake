@@ -1,2 +1,2 @@
 # The libraries that Korvane's sources use; none of them shows in a public header.
-find_package(ICU 72 REQUIRED COMPONENTS uc i18n)
+korvane_find(ICU 72 COMPONENTS uc i18n PKGCONFIG icu-uc icu-i18n)

@@ -11,6 +11,7 @@
 #include <korvane/platform/CFString.h>
 #include <korvane/platform/CFURL.h>
 #include <korvane/platform/CMTime.h>
+#include <korvane/platform/CMTimeRange.h>
 #include <korvane/platform/NSObject.h>
 #include <korvane/platform/NSRange.h>
 
@@ -33,6 +34,35 @@
 #include <korvane/foundation/KVURL.h>
 #include <korvane/foundation/KVUUID.h>
 #include <korvane/foundation/KVVersion.h>
+
+#include <korvane/serialization/KVAsciiStream.h>
+#include <korvane/serialization/KVBufferReadStream.h>
+#include <korvane/serialization/KVBufferWriteStream.h>
+#include <korvane/serialization/KVByteWriteStream.h>
+#include <korvane/serialization/KVFileReadStream.h>
+#include <korvane/serialization/KVFileWriteStream.h>
+#include <korvane/serialization/KVHash128.h>
+#include <korvane/serialization/KVHashWriteStream.h>
+#include <korvane/serialization/KVIgnoreElement.h>
+#include <korvane/serialization/KVMD5.h>
+#include <korvane/serialization/KVScope.h>
+#include <korvane/serialization/KVSerializer.h>
+#include <korvane/serialization/KVSerializerReadStream.h>
+#include <korvane/serialization/KVSerializerWriteStream.h>
+#include <korvane/serialization/KVStream.h>
+#include <korvane/serialization/KVStreamElement.h>
+#include <korvane/serialization/KVXMLWriteStream.h>
+#include <korvane/platform/KVKeyedCoder.h>
+#include <korvane/platform/NSCoder.h>
+#include <korvane/platform/NSError.h>
+#include <korvane/cache/KVCache.h>
+#include <korvane/cache/KVCacheImpl.h>
+#include <korvane/cache/KVCachedFunctionImpl.h>
+#include <korvane/cache/KVEvictionHeap.h>
+
+#include <korvane/time/IntermediateLargeInteger.h>
+#include <korvane/time/KVTime.h>
+#include <korvane/time/KVTimeRange.h>
 
 #include <korvane/media/KVAtomBox.h>
 #include <korvane/media/KVAtomBoxFile.h>

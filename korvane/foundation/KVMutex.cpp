@@ -3,6 +3,8 @@
 #include <korvane/foundation/KVException.h>
 #include <korvane/foundation/KVPrint.h>
 
+#include <pthread.h>
+
 namespace {
 
 void check(int result, char const* call, int line)
@@ -42,4 +44,39 @@ KVMutex::KVMutex(bool recursive)
 KVMutex::~KVMutex()
 {
     ::pthread_mutex_destroy(&mutex_);
+}
+
+void KVMutex::lock() noexcept
+{
+    ::pthread_mutex_lock(&mutex_);
+}
+
+void KVMutex::unlock() noexcept
+{
+    ::pthread_mutex_unlock(&mutex_);
+}
+
+KVConditionVariable::KVConditionVariable() noexcept
+{
+    ::pthread_cond_init(&condition_, nullptr);
+}
+
+KVConditionVariable::~KVConditionVariable()
+{
+    ::pthread_cond_destroy(&condition_);
+}
+
+void KVConditionVariable::wait(KVMutex* mutex) noexcept
+{
+    ::pthread_cond_wait(&condition_, &mutex->mutex_);
+}
+
+void KVConditionVariable::signal() noexcept
+{
+    ::pthread_cond_signal(&condition_);
+}
+
+void KVConditionVariable::broadcast() noexcept
+{
+    ::pthread_cond_broadcast(&condition_);
 }

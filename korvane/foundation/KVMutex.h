@@ -2,7 +2,9 @@
 
 #include <korvane/foundation/KVExport.h>
 
-#include <pthread.h>
+#include <condition_variable>
+#include <mutex>
+#include <type_traits>
 
 /// A mutual-exclusion lock. It is a BasicLockable, so `std::scoped_lock` holds it.
 ///
@@ -18,30 +20,31 @@ public:
     KVMutex& operator=(KVMutex const&) = delete;
     virtual ~KVMutex();
 
-    void lock() noexcept { ::pthread_mutex_lock(&mutex_); }
-    void unlock() noexcept { ::pthread_mutex_unlock(&mutex_); }
+    void lock() noexcept;
+    void unlock() noexcept;
 
 private:
     friend class KVConditionVariable;
-    pthread_mutex_t mutex_;
+    /// The system's lock, by the name that the standard library has for it.
+    std::remove_pointer_t<std::mutex::native_handle_type> mutex_;
 };
 
 /// Lets threads wait until another one tells them to look again.
 class KV_EXPORT KVConditionVariable {
 public:
-    KVConditionVariable() noexcept { ::pthread_cond_init(&condition_, nullptr); }
+    KVConditionVariable() noexcept;
     KVConditionVariable(KVConditionVariable const&) = delete;
     KVConditionVariable& operator=(KVConditionVariable const&) = delete;
-    ~KVConditionVariable() { ::pthread_cond_destroy(&condition_); }
+    ~KVConditionVariable();
 
     /// Releases the mutex, which the caller holds, waits, and takes it again. It may return without
     /// a signal: wait in a loop that tests what is waited for.
-    void wait(KVMutex* mutex) noexcept { ::pthread_cond_wait(&condition_, &mutex->mutex_); }
+    void wait(KVMutex* mutex) noexcept;
     /// Wakes one waiting thread.
-    void signal() noexcept { ::pthread_cond_signal(&condition_); }
+    void signal() noexcept;
     /// Wakes all of them.
-    void broadcast() noexcept { ::pthread_cond_broadcast(&condition_); }
+    void broadcast() noexcept;
 
 private:
-    pthread_cond_t condition_;
+    std::remove_pointer_t<std::condition_variable::native_handle_type> condition_;
 };

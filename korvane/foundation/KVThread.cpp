@@ -3,6 +3,8 @@
 #include <korvane/foundation/KVException.h>
 #include <korvane/foundation/KVInfo.h>
 
+#include <pthread.h>
+
 #include <memory>
 #include <string>
 #include <vector>
@@ -71,6 +73,11 @@ KVThread::KVThread(void (*function)(void*), void* argument, char const* name)
 KVThread::~KVThread()
 {
     detach();
+}
+
+KVThread::Native KVThread::self() noexcept
+{
+    return ::pthread_self();
 }
 
 void KVThread::cancel() noexcept

@@ -2,7 +2,7 @@
 
 #include <korvane/foundation/KVExport.h>
 
-#include <pthread.h>
+#include <thread>
 
 /// A handle on one thread, which runs from the moment that the handle is made.
 ///
@@ -12,6 +12,9 @@
 /// `wait` or `detach` once; a handle that goes while its thread is attached detaches it.
 class KV_EXPORT KVThread {
 public:
+    /// The system's thread, by the name that the standard library has for it.
+    using Native = std::thread::native_handle_type;
+
     /// `name` may be null; the system keeps up to 15 bytes of it. Throws KVSystemException if the
     /// thread cannot be started.
     KVThread(void (*function)(void*), void* argument, char const* name);
@@ -26,19 +29,16 @@ public:
     /// Lets the thread go on alone.
     void detach() noexcept;
     /// The calling thread.
-    static pthread_t self() noexcept { return ::pthread_self(); }
+    static Native self() noexcept;
     /// Whether this handle's thread is the calling one.
-    bool isSelf() const noexcept { return ::pthread_equal(thread_, ::pthread_self()) != 0; }
-    bool operator==(KVThread const& other) const noexcept
-    {
-        return ::pthread_equal(thread_, other.thread_) != 0;
-    }
+    bool isSelf() const noexcept { return thread_ == self(); }
+    bool operator==(KVThread const& other) const noexcept { return thread_ == other.thread_; }
 
     /// Runs `function(argument, index, count)` once for each index from 0, on as many threads as
     /// there are processors, and waits for all of them. The function must not throw.
     static void KVFork(void (*function)(void*, int, int), void* argument);
 
 private:
-    pthread_t thread_{};
+    Native thread_{};
     bool attached_ = false;
 };

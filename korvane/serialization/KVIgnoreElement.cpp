@@ -1,0 +1,9 @@
+#include <korvane/serialization/KVIgnoreElement.h>
+
+KVIgnoreElement::~KVIgnoreElement() = default;
+
+KVIgnoreElement& KVIgnoreElement::sharedInstance()
+{
+    static KVIgnoreElement instance;
+    return instance;
+}

@@ -1,0 +1,17 @@
+#pragma once
+
+namespace CLI {
+class App;
+}
+
+/// The commands of the tool, each family in a file of its own. A family adds its subcommands,
+/// with their options and help, to the program, which knows from them what it can do:
+/// help, manual pages and completions come from that one table.
+///
+/// A command's work is its callback. It throws ToolError to end with a message and an exit code.
+using AddCommands = void (*)(CLI::App& program);
+
+// The families, in the order in which `korvane --help` lists them.
+inline constexpr AddCommands commandFamilies[] = {
+    nullptr, // the end
+};

@@ -1,0 +1,52 @@
+#include "App.h"
+#include "AtomicOutput.h"
+#include "ToolError.h"
+
+#include <exception>
+#include <iostream>
+#include <sstream>
+
+namespace {
+
+/// Help and version are asked for and go to standard output; what is wrong goes to the other.
+ExitCode answerParseError(CLI::App const& app, CLI::ParseError const& error)
+{
+    std::ostringstream out;
+    std::ostringstream messages;
+    bool const asked = app.exit(error, out, messages) == 0;
+    if (asked) {
+        printOutput(out.str());
+        return ExitCode::Done;
+    }
+    printMessage(error.what());
+    std::cerr << "Run with --help for more information.\n";
+    return ExitCode::Usage;
+}
+
+ExitCode run(int count, char** arguments)
+{
+    auto const app = makeApp();
+    try {
+        try {
+            app->parse(count, arguments);
+            return ExitCode::Done;
+        } catch (CLI::ParseError const& error) {
+            return answerParseError(*app, error);
+        }
+    } catch (ToolError const& error) {
+        if (*error.what() != '\0')
+            printMessage(error.what());
+        return error.code();
+    } catch (std::exception const& error) {
+        printMessage(error.what());
+        return ExitCode::Failed;
+    }
+}
+
+} // namespace
+
+int main(int count, char** arguments)
+{
+    prepareProcess();
+    return static_cast<int>(run(count, arguments));
+}
