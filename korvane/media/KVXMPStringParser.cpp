@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <exception>
 #include <libxml/parser.h>
+#include <libxml/parserInternals.h>
 #include <limits>
 #include <memory>
 
