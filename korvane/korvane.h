@@ -104,3 +104,8 @@
 #include <korvane/captions/KVMutableCaption.h>
 #include <korvane/captions/KVSRTCaptionsExporter.h>
 #include <korvane/captions/KVSRTCaptionsImporter.h>
+#include <korvane/media/KVAtomBox.h>
+#include <korvane/media/KVAtomBoxFile.h>
+#include <korvane/media/KVAtomMetadataHandler.h>
+#include <korvane/media/KVImageDescAtomBox.h>
+#include <korvane/media/KVXMPStringParser.h>
