@@ -35,7 +35,15 @@
 #include <korvane/foundation/KVUUID.h>
 #include <korvane/foundation/KVVersion.h>
 
+#include <korvane/serialization/KVAsciiStream.h>
+#include <korvane/serialization/KVBufferReadStream.h>
+#include <korvane/serialization/KVBufferWriteStream.h>
+#include <korvane/serialization/KVByteWriteStream.h>
+#include <korvane/serialization/KVFileReadStream.h>
+#include <korvane/serialization/KVFileWriteStream.h>
+#include <korvane/serialization/KVHash128.h>
 #include <korvane/serialization/KVIgnoreElement.h>
+#include <korvane/serialization/KVMD5.h>
 #include <korvane/serialization/KVScope.h>
 #include <korvane/serialization/KVSerializer.h>
 #include <korvane/serialization/KVSerializerReadStream.h>
@@ -46,3 +54,10 @@
 #include <korvane/time/IntermediateLargeInteger.h>
 #include <korvane/time/KVTime.h>
 #include <korvane/time/KVTimeRange.h>
+#include <korvane/platform/KVKeyedCoder.h>
+#include <korvane/platform/NSCoder.h>
+#include <korvane/platform/NSError.h>
+#include <korvane/cache/KVCache.h>
+#include <korvane/cache/KVCacheImpl.h>
+#include <korvane/cache/KVCachedFunctionImpl.h>
+#include <korvane/cache/KVEvictionHeap.h>

@@ -1,5 +1,7 @@
 #include <korvane/foundation/KVSpinLock.h>
 
+#include <sys/single_threaded.h>
+
 namespace {
 
 void relaxProcessor() noexcept
@@ -13,6 +15,34 @@ void relaxProcessor() noexcept
 
 } // namespace
 
+void KVSpinLock::lock() noexcept
+{
+    if (!try_lock())
+        lockSlowly();
+}
+
+bool KVSpinLock::try_lock() noexcept
+{
+    // While there is one thread nobody can come between, and the bus need not be locked.
+    if (__libc_single_threaded) {
+        if (state_.load(std::memory_order_relaxed) != free)
+            return false;
+        state_.store(taken, std::memory_order_relaxed);
+        return true;
+    }
+    std::uint32_t expected = free;
+    return state_.compare_exchange_strong(expected, taken, std::memory_order_acquire,
+                                          std::memory_order_relaxed);
+}
+
+void KVSpinLock::unlock() noexcept
+{
+    if (__libc_single_threaded)
+        state_.store(free, std::memory_order_relaxed);
+    else if (state_.exchange(free, std::memory_order_release) == contended)
+        state_.notify_one();
+}
+
 void KVSpinLock::lockSlowly() noexcept
 {
     for (int turn = 0; turn < 100; ++turn) {
@@ -23,9 +53,4 @@ void KVSpinLock::lockSlowly() noexcept
     // Whoever has slept takes the lock as contended: it cannot know that it was the last one.
     while (state_.exchange(contended, std::memory_order_acquire) != free)
         state_.wait(contended, std::memory_order_relaxed);
-}
-
-void KVSpinLock::wakeOne() noexcept
-{
-    state_.notify_one();
 }

@@ -697,16 +697,9 @@ bool KVString::isUUID() const noexcept
 
 KVString const* KVString::intern(KVString const& text)
 {
-    // By unit, not by `compare`: the collation holds different texts for equal.
-    struct ByUnits {
-        bool operator()(KVString const& a, KVString const& b) const noexcept
-        {
-            return a.isNull() != b.isNull() ? a.isNull() : a.view() < b.view();
-        }
-    };
     struct Table {
         std::mutex mutex;
-        std::set<KVString, ByUnits> texts;
+        std::set<KVString> texts;
     };
     static auto& table = *new Table;
     std::scoped_lock const lock(table.mutex);

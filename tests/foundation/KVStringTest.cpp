@@ -191,6 +191,19 @@ TEST(KVString, ComparesByRootCollation)
     EXPECT_EQ(text.compare(99, 1, ""), 0);
 }
 
+TEST(KVString, OperatorsTellApartWhatReadsTheSame)
+{
+    KVString const composed("\u00E9");
+    KVString const decomposed("e\u0301");
+    EXPECT_EQ(composed.compare(decomposed), 0);
+    EXPECT_NE(composed, decomposed);
+    EXPECT_LT(decomposed, composed);
+    EXPECT_NE(KVString(), KVString(""));
+    EXPECT_LT(KVString(), KVString(""));
+    EXPECT_EQ(KVString("a").compare("a\u0001"), 0); // a control character has no weight
+    EXPECT_NE(KVString("a"), KVString("a\u0001"));
+}
+
 TEST(KVString, InterningTellsCanonicallyEqualTextsApart)
 {
     EXPECT_EQ(KVString::intern("track"), KVString::intern(KVString("track")));

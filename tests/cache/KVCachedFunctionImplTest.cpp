@@ -1,0 +1,119 @@
+#include <korvane/cache/KVCachedFunctionImpl.h>
+#include <korvane/foundation/KVException.h>
+#include <korvane/platform/CFNumber.h>
+
+#include <gtest/gtest.h>
+
+#include <array>
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <thread>
+#include <vector>
+
+namespace {
+
+TEST(KVCachedFunctionImpl, ComputesOncePerTupleOfArguments)
+{
+    int calls = 0;
+    KVCachedFunctionImpl<std::string, std::string const&, int> repeat(
+        [&](std::string const& text, int count) {
+            ++calls;
+            std::string result;
+            while (count-- > 0)
+                result += text;
+            return result;
+        },
+        2);
+    EXPECT_EQ(repeat("ab", 2), "abab");
+    EXPECT_EQ(repeat("ab", 2), "abab");
+    EXPECT_EQ(calls, 1);
+    EXPECT_EQ(repeat("ab", 1), "ab");
+    EXPECT_EQ(repeat("a", 2), "aa"); // the oldest of three leaves
+    EXPECT_EQ(calls, 3);
+    EXPECT_EQ(repeat("ab", 2), "abab");
+    EXPECT_EQ(calls, 4);
+}
+
+TEST(KVCachedFunctionImpl, CapacityIsWidenedWithItsSign)
+{
+    struct Row {
+        int capacity;
+        int calls;
+    } const rows[] = {{-1, 100}, {0, 200}, {100, 100}, {99, 200}};
+    for (auto const& row : rows) {
+        int calls = 0;
+        KVCachedFunctionImpl<bool, int> isOdd([&](int value) { return ++calls, value % 2 != 0; },
+                                              row.capacity);
+        for (int i = 0; i < 200; ++i)
+            EXPECT_EQ(isOdd(i % 100), i % 2 != 0);
+        EXPECT_EQ(calls, row.calls) << row.capacity;
+    }
+}
+
+TEST(KVCachedFunctionImpl, FailuresTravelAndAreNotKept)
+{
+    bool broken = true;
+    KVCachedFunctionImpl<int, int> half(
+        [&](int value) { return broken ? throw std::runtime_error("broken") : value / 2; }, 10);
+    EXPECT_THROW(half(8), std::runtime_error);
+    broken = false;
+    EXPECT_EQ(half(8), 4); // the lock is free again and nothing was kept
+
+    KVCachedFunctionImpl<int, int> none(nullptr, 10);
+    EXPECT_THROW(none(1), std::bad_function_call);
+    EXPECT_THROW(none(1), std::bad_function_call);
+}
+
+TEST(KVCachedFunctionImpl, RefusesToBeReentered)
+{
+    std::unique_ptr<KVCachedFunctionImpl<int, int>> factorial;
+    factorial = std::make_unique<KVCachedFunctionImpl<int, int>>(
+        [&](int value) { return value < 2 ? 1 : value * (*factorial)(value - 1); }, 10);
+    EXPECT_EQ((*factorial)(1), 1);
+    EXPECT_THROW((*factorial)(3), KVAssertionException);
+    EXPECT_EQ((*factorial)(1), 1);
+}
+
+TEST(KVCachedFunctionImpl, PlainReferencesAreRetainedWhileTheirResultIsKept)
+{
+    auto const first = KVCFRef<CFNumberRef>::adopt(new __CFNumber(1LL));
+    auto const second = KVCFRef<CFNumberRef>::adopt(new __CFNumber(2LL));
+    KVCachedFunctionImpl<bool, CFNumberRef, CFNumberRef> same(
+        [](CFNumberRef a, CFNumberRef b) { return CFEqual(a, b); }, 1);
+    EXPECT_FALSE(same(first, second));
+    EXPECT_EQ(first->retainCount(), 2u);
+    EXPECT_TRUE(same(second, second)); // evicts the other tuple
+    EXPECT_EQ(first->retainCount(), 1u);
+    EXPECT_EQ(second->retainCount(), 3u);
+    EXPECT_FALSE(same(nullptr, second));
+}
+
+TEST(KVCachedFunctionImpl, ThreadsComputeEachResidentKeyOnce)
+{
+    constexpr int keys = 50;
+    // Plain counters: the memoiser's lock is all that orders these writes.
+    std::array<int, keys> calls{};
+    KVCachedFunctionImpl<int, int> square(
+        [&](int value) {
+            ++calls[static_cast<std::size_t>(value)];
+            return value * value;
+        },
+        keys);
+    std::array<int, 4> wrong{};
+    std::vector<std::thread> threads;
+    for (std::size_t t = 0; t < wrong.size(); ++t)
+        threads.emplace_back([&, t] {
+            for (int i = 0; i < 5000; ++i) {
+                int const value = (i * 7 + static_cast<int>(t) * 13) % keys;
+                wrong[t] += square(value) != value * value;
+            }
+        });
+    for (auto& thread : threads)
+        thread.join();
+    EXPECT_EQ(wrong, (std::array<int, 4>{}));
+    for (int const count : calls)
+        EXPECT_EQ(count, 1);
+}
+
+} // namespace

@@ -1,0 +1,119 @@
+#include "SerializationSupport.h"
+
+namespace {
+
+std::string armour(std::string_view bytes)
+{
+    KVAsciiStream stream;
+    EXPECT_EQ(stream.write(bytes.data(), bytes.size()), static_cast<long long>(bytes.size()));
+    stream.close();
+    return stream.getString();
+}
+
+// Eight bytes of length and a "*": with the length 5, 00 00 00 | 00 00 00 | 00 05 2A.
+constexpr char headerOf0[] = "********"
+                             "***e";
+constexpr char headerOf5[] = "********"
+                             "**Ie";
+
+} // namespace
+
+TEST(KVAsciiStream, WritesThreeBytesAsFourCharacters)
+{
+    struct Row {
+        std::string_view bytes;
+        std::string text;
+    } const rows[] = {
+        {"", headerOf0},
+        // FF 00 FF: 63, 48, 3, 63. 01 02 00: 0, 16, 8, 0.
+        {std::string_view("\xFF\x00\xFF\x01\x02", 5), std::string(headerOf5) + "zk1z*E6*"},
+    };
+    for (Row const& row : rows)
+        EXPECT_EQ(armour(row.bytes), row.text);
+}
+
+TEST(KVAsciiStream, ReadsWhatItWrote)
+{
+    for (std::size_t length = 0; length < 20; ++length) {
+        std::string bytes(length, '\0');
+        for (std::size_t i = 0; i < length; ++i)
+            bytes[i] = static_cast<char>(i * 37 + 200);
+        std::string const text = armour(bytes);
+        EXPECT_EQ(text.size(), 12 + (length + 2) / 3 * 4);
+        for (unsigned long long const piece : {1, 2, 4, 5, 100}) {
+            KVAsciiStream stream;
+            ASSERT_TRUE(stream.open(text.c_str()));
+            std::string read;
+            char out[100];
+            while (long long const count = stream.read(out, piece))
+                read.append(out, static_cast<std::size_t>(count));
+            EXPECT_EQ(read, bytes) << "in pieces of " << piece;
+        }
+    }
+}
+
+TEST(KVAsciiStream, RefusesWhatHasNoHeader)
+{
+    struct Row {
+        char const* text;
+        unsigned long long length;
+        char const* error;
+    } const rows[] = {
+        {nullptr, 100, "Not enough data"},
+        {"", 0, "Not enough data"},
+        {"***********", 11, "Not enough data"},
+        {"************", 12, "Magic Number does not match"},
+        {"!!!!!!!!!!!!", 12, "Magic Number does not match"},
+        {headerOf0, 12, ""},
+    };
+    for (Row const& row : rows) {
+        KVAsciiStream stream;
+        EXPECT_EQ(stream.open(row.text, row.length), *row.error == '\0');
+        EXPECT_EQ(stream.getError().toUTF8(), row.error);
+        char byte;
+        EXPECT_EQ(stream.read(&byte, 1), 0);
+    }
+}
+
+TEST(KVAsciiStream, DoesNotBelieveTheHeaderMoreThanTheText)
+{
+    // A length of all ones, with two groups and a stray character behind the header.
+    std::string const text = "zzzzzzzzzzwe"
+                             "zzzz****z";
+    KVAsciiStream stream;
+    ASSERT_TRUE(stream.open(text.c_str()));
+    unsigned char out[100];
+    EXPECT_EQ(stream.read(out, 100), 6);
+    EXPECT_EQ(out[2], 0xFF);
+    EXPECT_EQ(out[3], 0);
+}
+
+TEST(KVAsciiStream, IsWrittenOrRead)
+{
+    KVAsciiStream stream;
+    char byte = 'a';
+    EXPECT_EQ(stream.write(&byte, 1), 1);
+    EXPECT_EQ(stream.getString().toUTF8(), headerOf0) << "until it is closed";
+    EXPECT_EQ(stream.read(&byte, 1), 0);
+    stream.close();
+    EXPECT_EQ(stream.write(&byte, 1), 0);
+    std::string const text = stream.getString();
+    ASSERT_TRUE(stream.open(text.c_str()));
+    EXPECT_EQ(stream.write(&byte, 1), 0);
+    stream.close();
+    EXPECT_EQ(stream.read(&byte, 1), 1);
+    stream.clear();
+    EXPECT_EQ(stream.getString().toUTF8(), "");
+    EXPECT_EQ(stream.write(&byte, 1), 1);
+}
+
+TEST(KVAsciiStream, KnowsItsAlphabet)
+{
+    int count = 0;
+    for (int c = 0; c < 256; ++c)
+        count += KVAsciiStream::validChar(static_cast<unsigned char>(c));
+    EXPECT_EQ(count, 64);
+    for (char const c : {'*', '-', '0', 'Z', 'z'})
+        EXPECT_TRUE(KVAsciiStream::validChar(static_cast<unsigned char>(c))) << c;
+    EXPECT_FALSE(KVAsciiStream::validChar('+'));
+}

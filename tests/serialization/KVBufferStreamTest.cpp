@@ -1,0 +1,111 @@
+#include "SerializationSupport.h"
+
+#include <climits>
+#include <numeric>
+
+TEST(KVBufferReadStream, ReadsWhatIsLeft)
+{
+    auto const data = KVCFRef<CFDataRef>::adopt(CFDataCreate(nullptr, "abcdef", 6));
+    KVBufferReadStream stream(data);
+    char out[8] = {};
+    EXPECT_EQ(stream.read(out, 4), 4);
+    EXPECT_EQ(stream.read(out + 4, 4), 2);
+    EXPECT_STREQ(out, "abcdef");
+    EXPECT_EQ(stream.read(out, 4), 0);
+    stream.setPos(7);
+    EXPECT_EQ(stream.getPos(), 6u) << "a position behind the end is the end";
+    EXPECT_EQ(stream.read(out, 1), 0);
+    stream.setPos(2);
+    EXPECT_EQ(stream.write("xyz", 3), 0);
+    EXPECT_EQ(stream.getPos(), 2u) << "writing moves nothing";
+    EXPECT_EQ(stream.read(out, ~0ull), 4);
+    EXPECT_EQ(stream.getError(), 0);
+
+    KVBufferReadStream none(nullptr);
+    EXPECT_EQ(none.read(out, 1), 0);
+}
+
+TEST(KVBufferReadStream, KeepsItsBlock)
+{
+    auto data = KVCFRef<CFDataRef>::adopt(CFDataCreate(nullptr, "abc", 3));
+    KVBufferReadStream stream(data);
+    data = nullptr;
+    char out[3];
+    EXPECT_EQ(stream.read(out, 3), 3);
+}
+
+TEST(KVBufferWriteStream, GrowsWhenAWriteReachesItsEnd)
+{
+    // Lengths around every end of the block, written whole and byte by byte.
+    for (int length = 0; length < 40; ++length) {
+        std::string text(static_cast<std::size_t>(length), '\0');
+        std::iota(text.begin(), text.end(), 'A');
+        KVBufferWriteStream whole(8, 4);
+        EXPECT_EQ(whole.write(text.data(), text.size()), length);
+        EXPECT_EQ(textOf(whole), text);
+        KVBufferWriteStream bytes(0, 0);
+        for (char const& c : text)
+            bytes.write(&c, 1);
+        EXPECT_EQ(textOf(bytes), text);
+        EXPECT_EQ(bytes.getPos(), text.size());
+    }
+}
+
+TEST(KVBufferWriteStream, KeepsItsSizeWhenThePositionGoesBack)
+{
+    KVBufferWriteStream stream(4, 4);
+    stream << "0123456789";
+    stream.setPos(3);
+    EXPECT_EQ(stream.getBufferSize(), 10u);
+    stream << "ab";
+    EXPECT_EQ(stream.getPos(), 5u);
+    EXPECT_EQ(textOf(stream), "012ab56789");
+    stream.setPos(8);
+    stream << "xyz and much more than the block had room for";
+    EXPECT_EQ(textOf(stream), "012ab567xyz and much more than the block had room for");
+    EXPECT_EQ(stream.read(nullptr, 4), 0);
+
+    stream.reset();
+    EXPECT_EQ(stream.getBufferSize(), 0u);
+    stream << "new";
+    EXPECT_EQ(textOf(stream), "new");
+}
+
+TEST(KVBufferWriteStream, FillsAGapWithZeros)
+{
+    KVBufferWriteStream stream(64, 4);
+    stream << "dirty memory, to be seen by nobody";
+    stream.reset();
+    stream.setPos(5);
+    EXPECT_EQ(stream.getBufferSize(), 0u) << "only a write extends the data";
+    stream << "x";
+    EXPECT_EQ(textOf(stream), std::string(5, '\0') + "x");
+}
+
+TEST(KVBufferWriteStream, CopiesItsData)
+{
+    KVBufferWriteStream stream(16, 16);
+    stream << "copied";
+    KVCFRef<CFDataRef> const data = stream.copyData();
+    std::unique_ptr<char, decltype(&std::free)> const block(static_cast<char*>(stream.copyBuffer()),
+                                                            &std::free);
+    stream.reset();
+    stream << "******";
+    EXPECT_EQ(std::string_view(block.get(), 6), "copied");
+    EXPECT_EQ(std::string_view(reinterpret_cast<char const*>(data->bytes()), data->length()),
+              "copied");
+}
+
+TEST(KVBufferWriteStream, ThrowsWhatItCannotHold)
+{
+    EXPECT_THROW(KVBufferWriteStream(-1, 16), KVException_WriteError);
+    KVBufferWriteStream stream(16, 16);
+    stream << "kept";
+    for (unsigned long long const position : {0x100000000ull, ~0ull}) {
+        stream.setPos(position);
+        EXPECT_THROW(stream.write("x", 1), KVException_WriteError) << position;
+    }
+    stream.setPos(4);
+    stream << "!";
+    EXPECT_EQ(textOf(stream), "kept!");
+}

@@ -1,0 +1,160 @@
+#include "SerializationSupport.h"
+
+#include <cerrno>
+#include <random>
+
+TEST(KVFileWriteStream, WritesAndEmptiesAFile)
+{
+    TemporaryFolder const folder;
+    std::string const path = folder.file("note.txt");
+    writeFile(path, "something longer that was there before");
+    {
+        KVFileWriteStream file(urlOf(path));
+        EXPECT_EQ(file.getError(), 0);
+        EXPECT_TRUE(file.getURL() == urlOf(path));
+        file << "Reel 12";
+        EXPECT_EQ(file.getPos(), 7u);
+        EXPECT_EQ(contentsOf(path), "") << "the buffer waits";
+        EXPECT_EQ(file.read(nullptr, 3), 0);
+    }
+    EXPECT_EQ(contentsOf(path), "Reel 12") << "the destructor writes the rest";
+}
+
+// The same moves and writes to a file and to memory, around the size of the file's buffer, give the
+// same bytes: positions in the buffer, in front of it, behind it, and writes that cross its ends.
+TEST(KVFileWriteStream, AgreesWithAMemoryStream)
+{
+    TemporaryFolder const folder;
+    std::string const path = folder.file("moves.bin");
+    std::mt19937 random(7);
+    for (int round = 0; round < 30; ++round) {
+        KVBufferWriteStream memory(4096, 1024);
+        KVFileWriteStream file(urlOf(path));
+        for (int step = 0; step < 60; ++step) {
+            unsigned long long const sizes[] = {0, 1, 4, 100, 20000, 51199, 51200, 51201, 70000};
+            std::string const bytes(sizes[random() % std::size(sizes)],
+                                    static_cast<char>('A' + random() % 26));
+            memory.write(bytes.data(), bytes.size());
+            file.write(bytes.data(), bytes.size());
+            ASSERT_EQ(file.getPos(), memory.getPos());
+            unsigned long long const end = memory.getBufferSize();
+            unsigned long long const targets[] = {
+                end, end, memory.getPos(), random() % (end + 1), end > 5 ? end - 5 : 0, end + 3};
+            unsigned long long const target = targets[random() % std::size(targets)];
+            memory.setPos(target);
+            file.setPos(target);
+            ASSERT_EQ(file.getPos(), target);
+        }
+        file.close();
+        ASSERT_TRUE(contentsOf(path) == textOf(memory)) << "round " << round;
+    }
+}
+
+TEST(KVFileWriteStream, PatchesBytesThatHaveLeftTheBuffer)
+{
+    TemporaryFolder const folder;
+    std::string const path = folder.file("patched.bin");
+    std::string expected(60000, 'a');
+    KVFileWriteStream file(urlOf(path));
+    file << expected.c_str() << "tail";
+    expected += "tail";
+    file.setPos(10);
+    file << "1234";
+    file.setPos(expected.size());
+    file << "!";
+    file.close();
+    expected.replace(10, 4, "1234");
+    EXPECT_TRUE(contentsOf(path) == expected + "!");
+}
+
+TEST(KVFileWriteStream, SaysWhatWentWrong)
+{
+    TemporaryFolder const folder;
+    struct Row {
+        KVURL url;
+        int error;
+    } const rows[] = {
+        {KVURL(), ENOENT},
+        {urlOf(folder.file("missing/note.txt")), ENOENT},
+        {urlOf(folder.file("")), EISDIR},
+    };
+    for (Row const& row : rows) {
+        KVFileWriteStream file(row.url);
+        EXPECT_EQ(file.getError(), row.error);
+        EXPECT_THROW(file.write("x", 1), KVException_WriteError);
+        EXPECT_THROW(file.setPos(0), KVException_WriteError);
+        EXPECT_THROW(file.close(), KVException_WriteError);
+    }
+}
+
+TEST(KVFileWriteStream, TellsOfAFullDisk)
+{
+    std::string const much(51200, 'x');
+    {
+        KVFileWriteStream file(urlOf("/dev/full"));
+        file << "in the buffer";
+        EXPECT_THROW(file.write(much.data(), much.size()), KVException_WriteError);
+        EXPECT_EQ(file.getError(), ENOSPC);
+        EXPECT_THROW(file.write("x", 1), KVException_WriteError) << "it stays failed";
+    }
+    KVFileWriteStream file(urlOf("/dev/full"));
+    file << "in the buffer";
+    try {
+        file.close();
+        ADD_FAILURE() << "the last bytes were lost without a word";
+    } catch (KVException_WriteError const& error) {
+        EXPECT_EQ(error.message().toUTF8(), "/dev/full: No space left on device");
+    }
+    EXPECT_NO_THROW(file.close()) << "a second close does nothing";
+    EXPECT_THROW(file.write("x", 1), KVException_WriteError);
+}
+
+TEST(KVFileReadStream, ReadsThroughItsWindow)
+{
+    TemporaryFolder const folder;
+    std::string const path = folder.file("read.bin");
+    std::string bytes(200000, '\0');
+    std::mt19937 random(3);
+    for (char& byte : bytes)
+        byte = static_cast<char>(random());
+    writeFile(path, bytes);
+
+    KVFileReadStream file(urlOf(path));
+    EXPECT_EQ(file.getError(), 0);
+    std::string out(bytes.size(), '\0');
+    for (int step = 0; step < 400; ++step) {
+        unsigned long long const sizes[] = {0, 1, 8, 65535, 65536, 65537, 100000};
+        unsigned long long const size = sizes[random() % std::size(sizes)];
+        unsigned long long const position =
+            random() % 3 ? random() % (bytes.size() + 10) : file.getPos();
+        file.setPos(position);
+        ASSERT_EQ(file.getPos(), position);
+        unsigned long long const expected =
+            position < bytes.size() ? std::min<unsigned long long>(size, bytes.size() - position)
+                                    : 0;
+        ASSERT_EQ(file.read(out.data(), size), static_cast<long long>(expected));
+        ASSERT_EQ(file.getPos(), position + expected);
+        if (expected) {
+            ASSERT_EQ(out.compare(0, expected, bytes, position, expected), 0);
+        }
+    }
+    EXPECT_EQ(file.write("x", 1), 0);
+}
+
+// Meant: what `read` returns is added to the position, -1 too.
+TEST(KVFileReadStream, LowersItsPositionByAFailure)
+{
+    TemporaryFolder const folder;
+    KVFileReadStream directory(urlOf(folder.file("")));
+    char byte;
+    EXPECT_EQ(directory.getError(), 0);
+    EXPECT_EQ(directory.read(&byte, 1), -1);
+    EXPECT_EQ(directory.getError(), EISDIR);
+    EXPECT_EQ(directory.getPos(), ~0ull);
+
+    KVFileReadStream missing(urlOf(folder.file("missing")));
+    EXPECT_EQ(missing.getError(), ENOENT);
+    EXPECT_EQ(missing.read(&byte, 1), -1);
+    KVFileReadStream null((KVURL()));
+    EXPECT_EQ(null.getError(), ENOENT);
+}

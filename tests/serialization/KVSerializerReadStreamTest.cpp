@@ -1,0 +1,294 @@
+#include "SerializationSupport.h"
+
+#include <functional>
+
+namespace {
+
+/// A stream with nothing to read: the frame alone.
+class Frame : public KVSerializerReadStream {
+public:
+    bool parse() override { return false; }
+    void abortParse() override {}
+    void stopParse() override {}
+};
+
+/// An element without a value, which counts how many of its kind are alive.
+class Element : public KVStreamElement {
+public:
+    explicit Element(KVSerializer* owner = nullptr) : KVStreamElement(1, nullptr, owner)
+    {
+        ++alive;
+    }
+    ~Element() override { --alive; }
+
+    bool getAsString(KVString*) override { return false; }
+    bool getAsInt32(int*) override { return false; }
+    bool getAsUInt32(unsigned int*) override { return false; }
+    bool getAsInt64(long long*) override { return false; }
+    bool getAsUInt64(unsigned long long*) override { return false; }
+    bool getAsFloat(float*) override { return false; }
+    bool getAsDouble(double*) override { return false; }
+    bool getAsBool(bool*) override { return false; }
+    KVUUID* getAsUUID() override { return nullptr; }
+    bool getAsVexTime(CMTime*) override { return false; }
+    bool getAttributeAsString(unsigned int, KVString*) const override { return false; }
+    bool getAttributeAsInt32(unsigned int, int*) const override { return false; }
+    bool getAttributeAsUInt32(unsigned int, unsigned int*) const override { return false; }
+    bool getAttributeAsInt64(unsigned int, long long*) const override { return false; }
+    bool getAttributeAsUInt64(unsigned int, unsigned long long*) const override { return false; }
+    bool getAttributeAsFloat(unsigned int, float*) const override { return false; }
+    bool getAttributeAsDouble(unsigned int, double*) const override { return false; }
+    bool getAttributeAsBool(unsigned int, bool*) const override { return false; }
+    KVUUID* getAttributeAsUUID(unsigned int) const override { return nullptr; }
+    bool getAttributeAsVexTime(unsigned int, CMTime*) const override { return false; }
+
+    static inline int alive = 0;
+};
+
+/// Notes its calls in a text that handlers share.
+class Handler : public KVIgnoreElement {
+public:
+    Handler(std::string name, std::string& log) : name_(std::move(name)), log_(log) {}
+    bool parseBegin(KVSerializerReadStream& stream) override
+    {
+        log_ += "begin " + name_ + "; ";
+        if (onBegin)
+            onBegin(stream);
+        return beginAnswer;
+    }
+    bool parseEnd(KVSerializerReadStream& stream) override
+    {
+        log_ += "end " + name_ + "; ";
+        if (onEnd)
+            onEnd(stream);
+        return true;
+    }
+    bool parseElement(KVSerializerReadStream&, KVStreamElement&) override
+    {
+        log_ += "element " + name_ + "; ";
+        return elementAnswer;
+    }
+
+    std::function<void(KVSerializerReadStream&)> onBegin, onEnd;
+    bool beginAnswer = true;
+    bool elementAnswer = true;
+
+private:
+    std::string name_;
+    std::string& log_;
+};
+
+KVScope first[] = {{"clip", 1, 0}, {"name", 1, 7}, {"both", 2, 0}, {"note", 3, 5}, {nullptr, 0, 0}};
+KVScope second[] = {{"both", 20, 0}, {"note", 30, 0}, {nullptr, 0, 0}};
+KVScope wildcard[] = {{"any", 9, 6}, {"*", 99, 0}, {"note", 31, 0}, {nullptr, 0, 0}};
+KVScope none[] = {{nullptr, 0, 0}};
+
+} // namespace
+
+TEST(KVSerializerReadStream, StartsWithDefaults)
+{
+    Frame frame;
+    EXPECT_EQ(frame.versionMajor(), 0u);
+    EXPECT_EQ(frame.versionMinor(), 0u);
+    EXPECT_EQ(frame.timeScale().value, 1);
+    EXPECT_EQ(frame.timeScale().timescale, 1);
+    EXPECT_EQ(frame.timeScaleSeconds(), 1.0);
+    EXPECT_FALSE(frame.hasTimeScale());
+    EXPECT_EQ(frame.currentElement(), nullptr);
+    EXPECT_EQ(frame.currentHandler(), nullptr);
+    EXPECT_EQ(frame.currentHandlerElement(), nullptr);
+    frame.popElement();
+    frame.popHandler();
+    frame.pushScope(first);
+
+    frame.setTimeScale(CMTimeMake(1001, 30000));
+    EXPECT_TRUE(frame.hasTimeScale());
+    EXPECT_DOUBLE_EQ(frame.timeScaleSeconds(), 1001.0 / 30000);
+}
+
+TEST(KVSerializerReadStream, ComparesVersions)
+{
+    struct Row {
+        unsigned int major, minor;
+        bool less;
+    } const rows[] = {{1, 9, true}, {2, 0, false}, {2, 1, false}, {3, 0, false}, {0, 99, true}};
+    for (Row const& row : rows) {
+        Frame frame;
+        frame.setVersion(row.major, row.minor);
+        EXPECT_EQ(frame.isLessThanVersion(2, 0), row.less) << row.major << "." << row.minor;
+    }
+}
+
+TEST(KVSerializerReadStream, FindsElementsInTheOrderOfPushing)
+{
+    struct Row {
+        std::vector<KVScope*> scopes;
+        char const* name;
+        KVScope* row; // null: not found
+        KVScope* scope;
+    } const rows[] = {
+        {{first, second}, "both", first + 2, first},
+        {{second, first}, "both", second, second},
+        {{first, second}, "note", second + 1, second}, // the first table has an attribute so named
+        {{first}, "note", nullptr, nullptr},
+        {{first}, "name", nullptr, nullptr},
+        {{first}, "Clip", nullptr, nullptr},
+        {{first}, "", nullptr, nullptr},
+        {{}, "clip", nullptr, nullptr},
+        {{none, nullptr, first}, "clip", first, first},
+        {{first, wildcard, second}, "both", first + 2, first},
+        {{wildcard, first}, "clip", wildcard + 1, wildcard}, // shadows later tables
+        {{wildcard}, "note", wildcard + 1, wildcard},        // and later rows
+    };
+    std::string log;
+    Handler handler("h", log);
+    for (Row const& row : rows) {
+        Frame frame;
+        frame.pushHandler(&handler);
+        for (KVScope* const scope : row.scopes)
+            frame.pushScope(scope);
+        KVScope* foundRow = first;
+        KVScope* foundScope = first;
+        KVSerializer* foundHandler = &KVIgnoreElement::sharedInstance();
+        EXPECT_EQ(frame.getElementInfo(row.name, &foundRow, &foundScope, &foundHandler),
+                  row.row != nullptr)
+            << row.name;
+        EXPECT_EQ(foundRow, row.row) << row.name;
+        EXPECT_EQ(foundScope, row.scope) << row.name;
+        EXPECT_EQ(foundHandler, row.row ? &handler : nullptr) << row.name;
+    }
+}
+
+TEST(KVSerializerReadStream, FindsElementsByToken)
+{
+    std::string log;
+    Handler handler("h", log);
+    Frame frame;
+    KVScope *row = none, *scope = none;
+    KVSerializer* found = &handler;
+    EXPECT_FALSE(frame.getElementInfo(1u, &row, &scope, &found));
+    EXPECT_TRUE(row == none && scope == none && found == &handler) << "left as they were";
+
+    frame.pushHandler(&handler);
+    frame.pushScope(first);
+    EXPECT_TRUE(frame.getElementInfo(1u, &row, &scope, &found));
+    EXPECT_EQ(row, first);
+    EXPECT_FALSE(frame.getElementInfo(3u, &row, &scope, &found)) << "that is an attribute's row";
+    EXPECT_TRUE(!row && !scope && !found);
+    frame.pushScope(wildcard);
+    EXPECT_TRUE(frame.getElementInfo(12345u, &row, &scope, &found));
+    EXPECT_EQ(row->elementToken, 99u);
+}
+
+TEST(KVSerializerReadStream, SearchesTheTopHandlersScopesOnly)
+{
+    std::string log;
+    Handler outer("outer", log), inner("inner", log);
+    inner.onBegin = [](KVSerializerReadStream& stream) { stream.pushScope(second); };
+    Frame frame;
+    frame.pushHandler(&outer);
+    frame.pushScope(first);
+    frame.pushHandler(&inner);
+    KVScope *row, *scope;
+    KVSerializer* handler;
+    EXPECT_FALSE(frame.getElementInfo("clip", &row, &scope, &handler));
+    EXPECT_TRUE(frame.getElementInfo("both", &row, &scope, &handler));
+    EXPECT_EQ(row, second);
+    frame.popHandler();
+    EXPECT_TRUE(frame.getElementInfo("clip", &row, &scope, &handler));
+    EXPECT_EQ(handler, &outer);
+}
+
+TEST(KVSerializerReadStream, PushesAndPopsHandlers)
+{
+    std::string log;
+    Handler a("a", log), b("b", log);
+    b.beginAnswer = false;
+    Frame frame;
+    EXPECT_TRUE(frame.pushHandler(&a));
+    auto* const element = new Element;
+    frame.pushElement(element);
+    EXPECT_FALSE(frame.pushHandler(&b)) << "the answer of parseBegin";
+    EXPECT_EQ(frame.currentHandler(), &b);
+    EXPECT_EQ(frame.currentHandlerElement(), element);
+    frame.popHandler();
+    EXPECT_EQ(frame.currentHandlerElement(), nullptr);
+    frame.pushHandler(&b);
+    frame.popAllHandlers();
+    EXPECT_EQ(log, "begin a; begin b; end b; begin b; end b; end a; ");
+}
+
+TEST(KVSerializerReadStream, TakesTheHandlerOffThatEnded)
+{
+    std::string log;
+    Handler a("a", log), b("b", log);
+    a.onEnd = [&](KVSerializerReadStream& stream) { stream.pushHandler(&b); };
+    Frame frame;
+    frame.pushHandler(&a);
+    frame.popHandler();
+    EXPECT_EQ(frame.currentHandler(), &b) << "what parseEnd pushed stays";
+}
+
+TEST(KVSerializerReadStream, ForgetsAnElementThatIsGone)
+{
+    std::string log;
+    Handler a("a", log), b("b", log);
+    Frame frame;
+    frame.pushElement(new Element);
+    frame.pushHandler(&a);
+    frame.pushHandler(&b);
+    frame.popHandler();
+    EXPECT_NE(frame.currentHandlerElement(), nullptr);
+    frame.popElement();
+    // The first of two handlers stays until all are popped, and no later element, which may have
+    // the same address, ends it.
+    EXPECT_EQ(frame.currentHandler(), &a);
+    EXPECT_EQ(frame.currentHandlerElement(), nullptr);
+}
+
+TEST(KVSerializerReadStream, HandsElementsToTheirHandler)
+{
+    std::string log;
+    Handler handler("h", log);
+    Frame frame;
+    Element element(&handler);
+    EXPECT_TRUE(frame.processElement(element));
+    EXPECT_TRUE(element.processed);
+    handler.elementAnswer = false;
+    EXPECT_FALSE(frame.processElement(element));
+    EXPECT_EQ(log, "element h; element h; ");
+
+    Element orphan;
+    EXPECT_FALSE(frame.processElement(orphan));
+    EXPECT_FALSE(orphan.processed);
+}
+
+TEST(KVSerializerReadStream, IgnoresThroughAHandlerWithoutScopes)
+{
+    Frame frame;
+    frame.ignoreElement();
+    EXPECT_EQ(frame.currentHandler(), &KVIgnoreElement::sharedInstance());
+    KVScope *row, *scope;
+    KVSerializer* handler;
+    EXPECT_FALSE(frame.getElementInfo("clip", &row, &scope, &handler));
+    EXPECT_FALSE(KVIgnoreElement::sharedInstance().readSignificantWhiteSpace());
+}
+
+TEST(KVSerializerReadStream, DestroysWhatIsLeftAndCallsNoHandler)
+{
+    std::string log;
+    Handler handler("h", log);
+    int const alive = Element::alive;
+    {
+        Frame frame;
+        frame.pushHandler(&handler);
+        for (int i = 0; i < 1000; ++i)
+            frame.pushElement(new Element);
+        frame.pushElement(nullptr);
+        frame.popElement();
+        frame.popElement();
+        EXPECT_EQ(Element::alive, alive + 999);
+    }
+    EXPECT_EQ(Element::alive, alive);
+    EXPECT_EQ(log, "begin h; ");
+}
