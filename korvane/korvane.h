@@ -51,9 +51,16 @@
 #include <korvane/serialization/KVStream.h>
 #include <korvane/serialization/KVStreamElement.h>
 
+#include <korvane/time/CMTimeRangeAndNonretainedObject.h>
 #include <korvane/time/IntermediateLargeInteger.h>
 #include <korvane/time/KVTime.h>
+#include <korvane/time/KVTimeCoding.h>
 #include <korvane/time/KVTimeRange.h>
+#include <korvane/time/VexTimeObj.h>
+#include <korvane/time/VexTimePairObj.h>
+#include <korvane/time/VexTimeRangeAndObject.h>
+#include <korvane/time/VexTimeRangeObj.h>
+#include <korvane/time/VexTimeRanges.h>
 #include <korvane/platform/KVKeyedCoder.h>
 #include <korvane/platform/NSCoder.h>
 #include <korvane/platform/NSError.h>
