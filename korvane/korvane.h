@@ -63,3 +63,8 @@
 #include <korvane/time/IntermediateLargeInteger.h>
 #include <korvane/time/KVTime.h>
 #include <korvane/time/KVTimeRange.h>
+
+#include <korvane/colour/lut_t.h>
+#include <korvane/colour/multilut_t.h>
+#include <korvane/colour/tfreader_t.h>
+#include <korvane/colour/vec_t.h>
