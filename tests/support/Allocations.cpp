@@ -10,9 +10,10 @@ namespace {
 
 std::atomic<long> made{0};
 std::atomic<long> untilFailure{0};
-std::atomic<long> live{0};
-std::atomic<long> most{0};
-long liveAtStart = 0;
+std::atomic<std::size_t> largest{0};
+std::atomic<long> held{0};
+std::atomic<long> mostHeld{0};
+long heldAtStart = 0;
 
 } // namespace
 
@@ -21,15 +22,20 @@ long allocations::count() noexcept
     return made;
 }
 
+std::size_t allocations::takeLargest() noexcept
+{
+    return largest.exchange(0);
+}
+
 long allocations::peak() noexcept
 {
-    return most - liveAtStart;
+    return mostHeld - heldAtStart;
 }
 
 void allocations::startPeak() noexcept
 {
-    liveAtStart = live;
-    most = live.load();
+    heldAtStart = held;
+    mostHeld = heldAtStart;
 }
 
 void allocations::failAt(long number) noexcept
@@ -40,19 +46,20 @@ void allocations::failAt(long number) noexcept
 void* operator new(std::size_t size)
 {
     ++made;
+    largest = std::max(largest.load(), size);
     if (untilFailure > 0 && --untilFailure == 0)
         throw std::bad_alloc();
     void* const block = std::malloc(size ? size : 1);
     if (!block)
         throw std::bad_alloc();
-    live += static_cast<long>(::malloc_usable_size(block));
-    most = std::max(most.load(), live.load());
+    held += static_cast<long>(::malloc_usable_size(block));
+    mostHeld = std::max(mostHeld.load(), held.load());
     return block;
 }
 
 void operator delete(void* block) noexcept
 {
-    live -= static_cast<long>(::malloc_usable_size(block));
+    held -= static_cast<long>(::malloc_usable_size(block));
     std::free(block);
 }
 
