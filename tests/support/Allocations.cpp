@@ -8,12 +8,18 @@ namespace {
 
 std::atomic<long> made{0};
 std::atomic<long> untilFailure{0};
+std::atomic<std::size_t> largest{0};
 
 } // namespace
 
 long allocations::count() noexcept
 {
     return made;
+}
+
+std::size_t allocations::takeLargest() noexcept
+{
+    return largest.exchange(0);
 }
 
 void allocations::failAt(long number) noexcept
@@ -24,6 +30,8 @@ void allocations::failAt(long number) noexcept
 void* operator new(std::size_t size)
 {
     ++made;
+    if (size > largest)
+        largest = size;
     if (untilFailure > 0 && --untilFailure == 0)
         throw std::bad_alloc();
     if (void* const block = std::malloc(size ? size : 1))
