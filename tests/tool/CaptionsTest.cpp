@@ -37,7 +37,8 @@ TEST(CaptionsTool, ConvertMovesTimesOntoFrames)
     EXPECT_EQ(runTool({"captions", "convert", sample, "-", "--offset", "0.25", "--tags"})
                   .out.substr(0, 35),
               "1\n01:00:00,750 --> 01:00:03,150\n<i>");
-    // Without frames a file keeps its milliseconds: 1.001 seconds are 1000.99... of them as a double.
+    // Without frames a file keeps its milliseconds: 1.001 seconds are 1000.99... of them as a
+    // double.
     std::string const odd = "1\n00:00:01,001 --> 00:00:04,350\nA\n";
     EXPECT_EQ(runTool({"captions", "convert", "-", "-"}, odd).out, odd);
     ToolResult const cut = runTool({"captions", "convert", sample, "-", "--offset", "-01:00:01"});

@@ -100,8 +100,8 @@ struct Strict {
 /// Without frames the times are those of the file, to the millisecond.
 Strict importStrictly(std::string_view bytes, std::optional<CMTime> frame, CMTime offset)
 {
-    // A time of n milliseconds is seldom a whole number of them as a `double`, and the import rounds
-    // down: so it takes place on a finer grid and the nearest millisecond is taken.
+    // A time of n milliseconds is seldom a whole number of them as a `double`, and the import
+    // rounds down: so it takes place on a finer grid and the nearest millisecond is taken.
     CMTime const microsecond = CMTimeMake(1, 1'000'000);
     CMTime const millisecond = CMTimeMake(1, 1000);
     std::vector<KVCaptionArray> arrays;
@@ -252,8 +252,8 @@ void convert(ConvertOptions const& options)
                      " before zero and is cut there");
 
     std::string file;
-    if (KVSRTCaptionsExporter::exportCaptionsToString(file, captions, frame.value_or(CMTimeMake(1, 1000)), kCMTimeZero,
-                                                      options.tags)) {
+    if (KVSRTCaptionsExporter::exportCaptionsToString(
+            file, captions, frame.value_or(CMTimeMake(1, 1000)), kCMTimeZero, options.tags)) {
         throw badInput(options.input,
                        "a text holds half a surrogate pair, which UTF-8 cannot hold");
     }
@@ -358,7 +358,8 @@ void addCaptionsCommands(CLI::App& program)
 {
     CLI::App& captions = *program.add_subcommand("captions", "SubRip captions");
     captions.require_subcommand(1);
-    char const* const frameHelp = "The length of a frame in seconds, such as 1001/24000; times go up to whole frames";
+    char const* const frameHelp =
+        "The length of a frame in seconds, such as 1001/24000; times go up to whole frames";
 
     auto const showOptions = std::make_shared<ShowOptions>();
     CLI::App& showCommand =
@@ -370,8 +371,8 @@ void addCaptionsCommands(CLI::App& program)
     showCommand.callback([showOptions] { show(*showOptions); });
 
     auto const convertOptions = std::make_shared<ConvertOptions>();
-    CLI::App& convertCommand =
-        *captions.add_subcommand("convert", "Move a file's captions in time, and onto whole frames");
+    CLI::App& convertCommand = *captions.add_subcommand(
+        "convert", "Move a file's captions in time, and onto whole frames");
     convertCommand.add_option("IN", convertOptions->input, "A SubRip file")->required();
     convertCommand.add_option("OUT", convertOptions->output, "The file to write")->required();
     convertCommand.add_option("--frame", convertOptions->frame, frameHelp);
