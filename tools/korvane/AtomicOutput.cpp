@@ -88,8 +88,6 @@ AtomicOutput::AtomicOutput(std::string path) : path_(std::move(path)), target_(p
     target_ = followLinks(path_);
     struct stat status;
     bool const exists = stat(target_.c_str(), &status) == 0;
-    if (exists && S_ISDIR(status.st_mode))
-        fail(EISDIR);
     if (exists && !S_ISREG(status.st_mode)) {
         fd_ = open(target_.c_str(), O_WRONLY | O_CLOEXEC);
         if (fd_ < 0)
