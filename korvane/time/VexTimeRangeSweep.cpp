@@ -13,83 +13,96 @@ constexpr std::int64_t greatestTicks = std::int64_t{1} << 61;
 
 /// A range in ticks of the common timescale.
 struct Span {
-    std::int64_t start, end;
-    bool isEmpty;
+    std::int64_t start = 0, end = 0;
+    bool isEmpty = true;
 
     /// Ranges at an infinity end where they start: not empty, but no range overlaps them.
     bool meetsOthers() const noexcept { return !isEmpty && start < end; }
 };
 
-/// The timescale on which all times are whole, and the ranges in its ticks.
+/// The timescale on which all times are whole.
 class CommonTimescale {
 public:
-    /// Appends the ranges, a null element as an empty one. False if there is no such timescale.
-    bool take(VexTimeRangeArray const& array, std::vector<CMTimeRange>& ranges)
+    /// The ranges of both arrays in its ticks, null ones as empty. False if there is no such
+    /// timescale or one does not fit.
+    bool read(VexTimeRangeArray const& a, VexTimeRangeArray const& b, std::vector<Span>& spans)
     {
-        ranges.reserve(ranges.size() + array.size());
-        for (VexTimeRangeObj const* range : array) {
-            ranges.push_back(range ? range->range() : kCMTimeRangeZero);
-            if (!take(ranges.back().start) || !take(ranges.back().duration))
+        spans.reserve(a.size() + b.size());
+        // Once mostly, and again where a later range has made the timescale longer.
+        do {
+            hasGrown_ = false;
+            spans.clear();
+            if (!append(a, spans) || !append(b, spans))
                 return false;
-        }
+        } while (hasGrown_);
         return true;
     }
 
-    /// False if the range does not fit.
-    bool spanOf(CMTimeRange const& range, Span* span) noexcept
+    /// Whether all times are unrounded numbers that have this timescale already, so that ranges can
+    /// be made from ticks alone.
+    bool isPlain() const noexcept { return isPlain_; }
+    CMTimeRange rangeOf(std::int64_t start, std::int64_t end) const noexcept
     {
-        std::int64_t duration;
-        if (!ticksOf(range.start, &span->start) || !ticksOf(range.duration, &duration) ||
-            duration < 0)
-            return false;
-        span->isEmpty = duration == 0;
-        span->end = duration == forever                               ? forever
-                    : span->start == before || span->start == forever ? span->start
-                                                                      : span->start + duration;
-        return true;
+        auto const timescale = static_cast<CMTimeScale>(timescale_);
+        return {CMTimeMake(start, timescale), CMTimeMake(end - start, timescale)};
     }
 
     std::int64_t ticksOf(std::int64_t seconds) const noexcept { return seconds * timescale_; }
 
 private:
-    static bool isInfinity(CMTime const& time, std::int64_t* ticks) noexcept
+    bool append(VexTimeRangeArray const& ranges, std::vector<Span>& spans)
     {
-        *ticks = CMTimeCompare(time, kCMTimeNegativeInfinity) == 0 ? before : forever;
-        return *ticks == before || CMTimeCompare(time, kCMTimePositiveInfinity) == 0;
-    }
-
-    bool take(CMTime const& time) noexcept
-    {
-        std::int64_t ticks;
-        if (!CMTimeIsNumeric(time))
-            return isInfinity(time, &ticks);
-        if (time.timescale < 1 || time.epoch != 0)
-            return false;
-        if (time.timescale != latest_ && timescale_ % time.timescale != 0)
-            timescale_ = std::lcm(timescale_, std::int64_t{time.timescale});
-        latest_ = time.timescale;
-        return timescale_ <= INT32_MAX;
+        for (VexTimeRangeObj const* range : ranges) {
+            Span& span = spans.emplace_back();
+            std::int64_t duration;
+            if (!range)
+                continue;
+            if (!ticksOf(range->start(), &span.start) || !ticksOf(range->duration(), &duration) ||
+                duration < 0)
+                return false;
+            span.isEmpty = duration == 0;
+            span.end = duration == forever                             ? forever
+                       : span.start == before || span.start == forever ? span.start
+                                                                       : span.start + duration;
+        }
+        return true;
     }
 
     bool ticksOf(CMTime const& time, std::int64_t* ticks) noexcept
     {
-        if (!CMTimeIsNumeric(time))
-            return isInfinity(time, ticks);
-        if (time.timescale != latest_ || factor_ == 0) {
-            latest_ = time.timescale;
-            factor_ = timescale_ / latest_;
+        if (time.flags != kCMTimeFlags_Valid)
+            isPlain_ = false;
+        if (!CMTimeIsNumeric(time)) {
+            *ticks = CMTimeCompare(time, kCMTimeNegativeInfinity) == 0 ? before : forever;
+            return *ticks == before || CMTimeCompare(time, kCMTimePositiveInfinity) == 0;
         }
-        return !__builtin_mul_overflow(time.value, factor_, ticks) && *ticks >= -greatestTicks &&
-               *ticks <= greatestTicks;
+        if (time.timescale != latest_ && !change(time.timescale))
+            return false;
+        return time.epoch == 0 && !__builtin_mul_overflow(time.value, factor_, ticks) &&
+               *ticks >= -greatestTicks && *ticks <= greatestTicks;
+    }
+
+    /// Makes another timescale the one of `latest_` and `factor_`.
+    bool change(CMTimeScale timescale) noexcept
+    {
+        if (timescale < 1)
+            return false;
+        isPlain_ = isPlain_ && latest_ == 0;
+        hasGrown_ = hasGrown_ || (latest_ != 0 && timescale_ % timescale != 0);
+        timescale_ = std::lcm(timescale_, std::int64_t{timescale});
+        latest_ = timescale;
+        factor_ = timescale_ / timescale;
+        return timescale_ <= INT32_MAX;
     }
 
     std::int64_t timescale_ = 1;
-    // Neighbours mostly have one timescale.
-    std::int64_t latest_ = 1, factor_ = 0;
+    bool hasGrown_ = false, isPlain_ = true;
+    CMTimeScale latest_ = 0; // neighbours mostly have one timescale
+    std::int64_t factor_ = 0;
 };
 
 using Index = std::uint32_t;
-constexpr std::size_t greatestCount = UINT32_MAX;
+constexpr std::size_t greatestCount = UINT32_MAX - 2;
 
 // --- Add ---
 
@@ -216,49 +229,58 @@ NSObject const* kv::objectOf(VexTimeRangeObj const* range) noexcept
 
 bool kv::addBySweep(VexTimeRangeArray& array, VexTimeRangeArray const& added, bool keepObjectsApart)
 {
+    std::size_t const count = array.size() + added.size();
     CommonTimescale scale;
-    std::vector<CMTimeRange> ranges; // those of the array, and then those that are added
-    if (array.size() + added.size() > greatestCount || !scale.take(array, ranges) ||
-        !scale.take(added, ranges))
+    std::vector<Span> spans;
+    if (count > greatestCount || !scale.read(array, added, spans))
         return false;
 
-    auto const objectAt = [&](std::size_t id) -> VexTimeRangeObj* {
+    // Ranges have numbers, those that are added behind the others.
+    auto const rangeAt = [&](std::size_t id) -> VexTimeRangeObj* {
         return id < array.size() ? array[id] : added[id - array.size()];
     };
-    constexpr Index none = UINT32_MAX, dropped = none - 1;
-    std::vector<Index> stopOf(ranges.size(), none);
+    // What becomes of a range: it stays, goes, or is replaced by the union of that number.
+    constexpr Index stays = UINT32_MAX, goes = stays - 1;
+    std::vector<Index> fates(count, stays);
     std::vector<Stop> stops;
-    stops.reserve(ranges.size());
+    stops.reserve(count);
     Groups groups;
-    for (std::size_t id = 0; id < ranges.size(); ++id) {
-        Span span;
-        if (!scale.spanOf(ranges[id], &span))
-            return false;
+    for (std::size_t id = 0; id < count; ++id) {
+        Span const& span = spans[id];
         if (span.meetsOthers())
             stops.push_back({span.start, span.end,
-                             keepObjectsApart ? groups.of(objectOf(objectAt(id))) : 0,
+                             keepObjectsApart ? groups.of(objectOf(rangeAt(id))) : 0,
                              static_cast<Index>(id)});
         else if (span.isEmpty && id >= array.size())
-            stopOf[id] = dropped;
+            fates[id] = goes;
     }
     std::sort(stops.begin(), stops.end());
 
     Joined joined(stops);
     joinOverlapping(stops, array.size(), joined);
-    for (Index i = 0; i < stops.size(); ++i)
-        stopOf[stops[i].id] = i;
+    std::vector<CMTimeRange> unions;
+    for (Index i = 0; i < stops.size(); ++i) {
+        Index const root = joined.rootOf(i), id = stops[i].id;
+        if (joined.isAlone(root))
+            continue;
+        if (id == joined.leader(root)) {
+            fates[id] = static_cast<Index>(unions.size());
+            Stop const &first = stops[root], &last = stops[joined.last(root)];
+            unions.push_back(scale.isPlain() ? scale.rangeOf(first.start, last.end)
+                                             : KV_CMTimeRangeUnion(rangeAt(first.id)->range(),
+                                                                   rangeAt(last.id)->range()));
+        } else {
+            fates[id] = goes;
+        }
+    }
 
     VexTimeRangeArray result;
-    result.reserve(array.size());
-    for (std::size_t id = 0; id < ranges.size(); ++id) {
-        if (stopOf[id] == dropped)
+    result.reserve(count - static_cast<std::size_t>(std::count(fates.begin(), fates.end(), goes)));
+    for (std::size_t id = 0; id < count; ++id) {
+        if (fates[id] == goes)
             continue;
-        Index const root = stopOf[id] == none ? none : joined.rootOf(stopOf[id]);
-        if (root != none && joined.leader(root) != id)
-            continue;
-        if (root != none && !joined.isAlone(root))
-            result.push_back(objectAt(id)->copyWithRange(
-                KV_CMTimeRangeUnion(ranges[stops[root].id], ranges[stops[joined.last(root)].id])));
+        if (fates[id] != stays)
+            result.push_back(rangeAt(id)->copyWithRange(unions[fates[id]]));
         else if (id < array.size())
             result.push_back(std::move(array[id]));
         else
@@ -300,61 +322,58 @@ std::vector<Hole> joinedHoles(std::vector<Hole> each)
 bool kv::subtractBySweep(VexTimeRangeArray& array, VexTimeRangeArray const& subtracted)
 {
     CommonTimescale scale;
-    std::vector<CMTimeRange> ranges, cuts;
-    if (subtracted.size() > greatestCount || !scale.take(array, ranges) ||
-        !scale.take(subtracted, cuts))
+    std::vector<Span> spans;
+    if (subtracted.size() > greatestCount || !scale.read(array, subtracted, spans))
         return false;
 
     std::vector<Hole> each; // in the order in which they are given
-    each.reserve(cuts.size());
-    for (Index i = 0; i < cuts.size(); ++i) {
-        Span span;
-        if (!scale.spanOf(cuts[i], &span))
-            return false;
-        if (span.meetsOthers())
+    each.reserve(subtracted.size());
+    for (Index i = 0; i < subtracted.size(); ++i)
+        if (Span const& span = spans[array.size() + i]; span.meetsOthers())
             each.push_back({span.start, span.end, i, i});
-    }
-    std::vector<Span> spans(ranges.size());
-    for (std::size_t i = 0; i < ranges.size(); ++i)
-        if (!scale.spanOf(ranges[i], &spans[i]))
-            return false;
     std::vector<Hole> const holes = joinedHoles(each);
+    // Searched for every element: close together, so that they stay near the processor.
+    std::vector<std::int64_t> ends(holes.size());
+    std::transform(holes.begin(), holes.end(), ends.begin(), [](Hole const& h) { return h.end; });
 
     VexTimeRangeArray result;
     result.reserve(array.size());
     for (std::size_t i = 0; i < array.size(); ++i) {
         std::int64_t start = spans[i].start, end = spans[i].end;
-        auto hole = std::upper_bound(holes.begin(), holes.end(), start,
-                                     [](std::int64_t at, Hole const& h) { return at < h.end; });
+        auto hole =
+            holes.begin() + (std::upper_bound(ends.begin(), ends.end(), start) - ends.begin());
         if (!spans[i].meetsOthers() || hole == holes.end() || hole->start >= end) {
             result.push_back(std::move(array[i]));
             continue;
         }
 
-        CMTime pieceStart = ranges[i].start;
+        VexTimeRangeObj const* const range = array[i];
+        CMTime pieceStart = range->start();
         if (start == before) {
             // The first that cuts into an open start leaves one year of it.
             auto const first = std::find_if(each.begin(), each.end(),
                                             [&](Hole const& cut) { return cut.start < end; });
             if (first->start != before) {
                 start = first->start - scale.ticksOf(kKV_CMTimeOneYear.value);
-                pieceStart = CMTimeSubtract(cuts[first->opens].start, kKV_CMTimeOneYear);
+                pieceStart = CMTimeSubtract(subtracted[first->opens]->start(), kKV_CMTimeOneYear);
                 while (hole->end <= start)
                     ++hole;
             }
         }
-        auto const emit = [&](CMTime const& pieceEnd) {
-            result.push_back(
-                array[i]->copyWithRange(KV_CMTimeRangeMakeWithStartEnd(pieceStart, pieceEnd)));
+        auto const emit = [&](std::int64_t to, auto pieceEnd) {
+            result.push_back(range->copyWithRange(
+                scale.isPlain() ? scale.rangeOf(start, to)
+                                : KV_CMTimeRangeMakeWithStartEnd(pieceStart, pieceEnd())));
         };
         for (; hole != holes.end() && hole->start < end; ++hole) {
             if (hole->start > start)
-                emit(cuts[hole->opens].start);
-            pieceStart = KV_CMTimeRangeEnd(cuts[hole->closes]);
+                emit(hole->start, [&] { return subtracted[hole->opens]->start(); });
             start = hole->end;
+            if (!scale.isPlain())
+                pieceStart = subtracted[hole->closes]->end();
         }
         if (start < end)
-            emit(KV_CMTimeRangeEnd(ranges[i]));
+            emit(end, [&] { return range->end(); });
     }
     array = std::move(result);
     return true;
