@@ -93,6 +93,10 @@
 #include <korvane/time/VexTimeRangeObj.h>
 #include <korvane/time/VexTimeRanges.h>
 
+#include <korvane/colour/lut_t.h>
+#include <korvane/colour/multilut_t.h>
+#include <korvane/colour/tfreader_t.h>
+#include <korvane/colour/vec_t.h>
 #include <korvane/numerics/KVMatrix33Tmpl.h>
 #include <korvane/numerics/KVMatrix44Double.h>
 #include <korvane/numerics/KVMatrix44Measure.h>
