@@ -62,9 +62,11 @@ std::vector<std::vector<Bar>> rowsOf(TimelineSet const& set, Scale const& scale,
     auto const width = static_cast<double>(columns);
     std::vector<Bar> bars;
     for (VexTimeRangeObj const* range : set.ranges) {
-        auto const from = static_cast<std::size_t>(scale.at(range->start()) * width);
-        auto const to = static_cast<std::size_t>(std::ceil(scale.at(range->end()) * width));
-        bars.push_back({range, std::min(from, columns - 1), std::max(from + 1, to)});
+        // Rounded, so that ranges that touch do so in the picture.
+        auto const from = static_cast<std::size_t>(std::round(scale.at(range->start()) * width));
+        auto const to = static_cast<std::size_t>(std::round(scale.at(range->end()) * width));
+        std::size_t const first = std::min(from, columns - 1);
+        bars.push_back({range, first, std::max(first + 1, to)});
     }
     std::stable_sort(bars.begin(), bars.end(), [](Bar const& a, Bar const& b) {
         return CMTimeCompare(a.range->start(), b.range->start()) < 0;

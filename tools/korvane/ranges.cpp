@@ -11,10 +11,11 @@
 namespace {
 
 char const* const rangesFooter =
-    R"(A SET is a list of ranges, "0..3,1001/30000+2,5..inf=clip", or the name of a file of such lists, a
-line each, where # begins a comment. A list begins with a digit, a sign or "inf"; "-" alone is
-standard input. A range is START..END or START+DURATION, in the forms of "korvane time", and may
-have a name behind "=". Results are printed in the same form. Ranges that touch stay two.)";
+    R"(A SET is a list of ranges, "0..3,1001/30000+2,5..inf=clip", or the name of a file that has a range
+on each line; a line that begins with # is a comment. A list begins with a digit, a sign or "inf";
+"-" alone is standard input. A range is START..END or START+DURATION, in the forms of "korvane
+time", and may have a name behind "=". A list that begins with "-inf" stands behind "--". Results
+are printed as a file has them. Ranges that touch stay two.)";
 
 struct RangesOptions {
     std::vector<std::string> sets;
@@ -48,47 +49,57 @@ KVNSRef<VexTimeRangeObj*> parseRange(std::string_view text)
     return KVMakeRef<VexTimeRangeAndObject>(range, KVString::fromUTF8(name).cf_str());
 }
 
-/// Appends the ranges between commas; blanks around them do not count.
-void parseList(std::string_view list, VexTimeRangeArray& ranges)
+std::string_view trimmed(std::string_view text)
 {
     constexpr char blanks[] = " \t\r";
-    while (!list.empty()) {
-        std::size_t const comma = std::min(list.find(','), list.size());
-        std::string_view item = list.substr(0, comma);
-        list.remove_prefix(std::min(comma + 1, list.size()));
-        item.remove_prefix(std::min(item.find_first_not_of(blanks), item.size()));
-        item = item.substr(0, item.find_last_not_of(blanks) + 1);
-        if (!item.empty())
-            ranges.push_back(parseRange(item));
+    text.remove_prefix(std::min(text.find_first_not_of(blanks), text.size()));
+    return text.substr(0, text.find_last_not_of(blanks) + 1);
+}
+
+/// Calls `visit` with each piece between separators and its number, from 1.
+template <class Visit>
+void split(std::string_view text, char separator, Visit visit)
+{
+    for (unsigned long number = 1; !text.empty(); ++number) {
+        std::size_t const end = std::min(text.find(separator), text.size());
+        visit(trimmed(text.substr(0, end)), number);
+        text.remove_prefix(std::min(end + 1, text.size()));
     }
+}
+
+VexTimeRangeArray readList(std::string_view list)
+{
+    VexTimeRangeArray ranges;
+    split(list, ',', [&](std::string_view item, unsigned long) {
+        try {
+            ranges.push_back(parseRange(item));
+        } catch (TimeSyntaxError const& error) {
+            throw ToolError(ExitCode::Usage, error.what());
+        }
+    });
+    return ranges;
+}
+
+VexTimeRangeArray readRangeFile(std::string const& path)
+{
+    VexTimeRangeArray ranges;
+    split(readFile(path), '\n', [&](std::string_view item, unsigned long line) {
+        if (item.empty() || item.starts_with('#'))
+            return;
+        try {
+            ranges.push_back(parseRange(item));
+        } catch (TimeSyntaxError const& error) {
+            throw badInput(path, line, error.what());
+        }
+    });
+    return ranges;
 }
 
 VexTimeRangeArray readSet(std::string const& set)
 {
-    VexTimeRangeArray ranges;
-    bool const isFile =
-        set == "-" || (set.find_first_of("0123456789+-") != 0 && !set.starts_with("inf"));
-    if (!isFile) {
-        try {
-            parseList(set, ranges);
-        } catch (TimeSyntaxError const& error) {
-            throw ToolError(ExitCode::Usage, error.what());
-        }
-        return ranges;
-    }
-    std::string const text = readFile(set);
-    unsigned long line = 1;
-    for (std::size_t at = 0; at < text.size(); ++line) {
-        std::size_t const end = std::min(text.find('\n', at), text.size());
-        std::string_view const whole = std::string_view(text).substr(at, end - at);
-        try {
-            parseList(whole.substr(0, whole.find('#')), ranges);
-        } catch (TimeSyntaxError const& error) {
-            throw badInput(set, line, error.what());
-        }
-        at = end + 1;
-    }
-    return ranges;
+    bool const isList =
+        set != "-" && (set.find_first_of("0123456789+-") == 0 || set.starts_with("inf"));
+    return isList ? readList(set) : readRangeFile(set);
 }
 
 std::string nameOf(VexTimeRangeObj const* range)
