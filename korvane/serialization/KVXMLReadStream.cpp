@@ -278,6 +278,8 @@ void KVXMLReadStream::startElement()
             auto* const element =
                 static_cast<KVXMLStreamElement*>(createElement(row->elementToken, scope, handler));
             pushElement(element);
+            if (reader.observer)
+                element->line_ = reader.line();
             addAttributes(*element);
             if (xmlTextReaderIsEmptyElement(reader.reader) == 1)
                 endElement();
