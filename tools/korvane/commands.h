@@ -21,4 +21,9 @@ inline constexpr AddCommands commandFamilies[] = {
     addMatrixCommands,
     addSceneCommands,
     nullptr, // the end
+
+/// The families, in the order in which `korvane --help` lists them.
+inline constexpr AddCommands commandFamilies[] = {
+    addMatrixCommands,
+    addCaptionsCommands,
 };
