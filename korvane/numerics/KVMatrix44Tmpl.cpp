@@ -6,7 +6,7 @@
 #include <numbers>
 #include <utility>
 
-#if defined(__x86_64__) && !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
+#if defined(__x86_64__)
 // One more form of a function for machines that have AVX, chosen when the library is loaded. It
 // rounds as the other does: none of them may fuse a product and a sum.
 #define KV_WIDE_CLONES __attribute__((target_clones("avx", "default")))
