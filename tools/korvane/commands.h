@@ -16,5 +16,10 @@ void addMatrixCommands(CLI::App& program);
 // The families, in the order in which `korvane --help` lists them.
 inline constexpr AddCommands commandFamilies[] = {
     addMatrixCommands,
+void addCaptionsCommands(CLI::App& program);
+
+// The families, in the order in which `korvane --help` lists them.
+inline constexpr AddCommands commandFamilies[] = {
+    addCaptionsCommands,
     nullptr, // the end
 };
