@@ -113,3 +113,7 @@
 #include <korvane/media/KVAtomMetadataHandler.h>
 #include <korvane/media/KVImageDescAtomBox.h>
 #include <korvane/media/KVXMPStringParser.h>
+
+#include <korvane/compositing/KVBlend.h>
+#include <korvane/compositing/KVFxBlendOptions.h>
+#include <korvane/compositing/KVFxLightWrapOptions.h>
