@@ -152,12 +152,12 @@ void KVSRTCaptionsImporter::takeFontColor(std::u16string_view token)
 
 KVSRTCaptionsImporter::Tag KVSRTCaptionsImporter::_tagFromToken(KVString const& token)
 {
-    KVSubRip::Tag const tag =
+    Tag const tag =
         KVSubRip::tagFromToken(token.view(), KVSubRip::CharacterSet(tagBeginningCharacters_.view()),
                                KVSubRip::CharacterSet(tagEndingCharacters_.view()));
-    if (tag == KVSubRip::font)
+    if (tag == font)
         takeFontColor(token.view());
-    return static_cast<Tag>(tag);
+    return tag;
 }
 
 KVNSRef<NSAttributedString*>
