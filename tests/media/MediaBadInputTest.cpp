@@ -73,7 +73,7 @@ TEST(MediaBadInput, AMovieMayEndAnywhere)
         Mill mill(movie);
         ASSERT_EQ(mill.written(), 1);
         std::size_t const media = movie.find("mdat");
-        for (std::size_t length = 0; length < movie.size(); length += length < media + 20 ? 1 : 509)
+        for (std::size_t length = 0; length < movie.size(); length += length < media + 20 ? 1 : 61)
             ASSERT_NO_FATAL_FAILURE(mill.run(movie.substr(0, length))) << length;
         EXPECT_GT(mill.written(), 5) << "all of the tracks is there, some of the media data";
     }
@@ -85,7 +85,7 @@ TEST(MediaBadInput, EachNumberMayBeWrong)
     std::string const movie = readFile(sampleMovie("colr.mp4"));
     std::size_t const media = movie.find("mdat") + 4;
     Mill mill(movie);
-    for (std::size_t position = 0; position < media; position += position < 1100 ? 3 : 1)
+    for (std::size_t position = 0; position < media; ++position)
         for (std::uint32_t const value : {0u, 1u, 7u, 8u, 0x7FFFFFFFu, 0x80000000u, 0xFFFFFFFFu})
             ASSERT_NO_FATAL_FAILURE(mill.run(std::string(movie).replace(position, 4, be32(value))))
                 << position << ' ' << value;
