@@ -37,6 +37,10 @@ if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU" AND CMAKE_CXX_COMPILER_VERSION VERSION_L
   # g++ 12 sees overlaps inside the standard library's strings where there are none.
   add_compile_options(-Wno-restrict)
 endif()
+if(CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
+  # Unlike g++ it warns of a format that is handed on together with a va_list.
+  add_compile_options(-Wno-format-nonliteral)
+endif()
 if(KORVANE_DEVELOPER)
   add_compile_options(-Werror)
 endif()
@@ -53,6 +57,10 @@ endif()
 if(KORVANE_SANITIZE)
   add_compile_options(-fsanitize=${KORVANE_SANITIZE} -fno-omit-frame-pointer
                       -fno-sanitize-recover=all)
+  if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+    # The sanitizers' own code hides from g++ what is set where.
+    add_compile_options(-Wno-maybe-uninitialized)
+  endif()
   add_link_options(-fsanitize=${KORVANE_SANITIZE})
 endif()
 if(KORVANE_COVERAGE)
