@@ -1,0 +1,2 @@
+#include "commands.h"
+void addMediaCommands(CLI::App&){}
