@@ -15,6 +15,7 @@ void addBlendCommands(CLI::App& program);
 void addCaptionsCommands(CLI::App& program);
 void addLutCommands(CLI::App& program);
 void addMatrixCommands(CLI::App& program);
+void addMediaCommands(CLI::App& program);
 void addSceneCommands(CLI::App& program);
 
 /// The families, in the order in which `korvane --help` lists them.
@@ -24,5 +25,6 @@ inline constexpr AddCommands commandFamilies[] = {
     addMatrixCommands,
     addLutCommands,
     addBlendCommands,
+    addMediaCommands,
     nullptr, // the end
 };
