@@ -82,10 +82,21 @@
 #include <korvane/cache/KVCachedFunctionImpl.h>
 #include <korvane/cache/KVEvictionHeap.h>
 
+#include <korvane/time/CMTimeRangeAndNonretainedObject.h>
 #include <korvane/time/IntermediateLargeInteger.h>
 #include <korvane/time/KVTime.h>
+#include <korvane/time/KVTimeCoding.h>
 #include <korvane/time/KVTimeRange.h>
+#include <korvane/time/VexTimeObj.h>
+#include <korvane/time/VexTimePairObj.h>
+#include <korvane/time/VexTimeRangeAndObject.h>
+#include <korvane/time/VexTimeRangeObj.h>
+#include <korvane/time/VexTimeRanges.h>
 
+#include <korvane/colour/lut_t.h>
+#include <korvane/colour/multilut_t.h>
+#include <korvane/colour/tfreader_t.h>
+#include <korvane/colour/vec_t.h>
 #include <korvane/numerics/KVMatrix33Tmpl.h>
 #include <korvane/numerics/KVMatrix44Double.h>
 #include <korvane/numerics/KVMatrix44Measure.h>

@@ -402,7 +402,8 @@ KVImageDescAtomBox::copyAtomBoxChildPayloads(KVAtomBox const* atom,
     auto payloads = makeDictionary();
     for (unsigned int const type : types) {
         KVAtomBox const* const child = atom ? atom->findFirstChild(true, type) : nullptr;
-        if (!child)
+        // One that was made here has no place in the source.
+        if (!child || child->getOffset() == 0)
             continue;
         Bytes const source =
             sourceBytes(child->getOffset() + child->getHeaderSize(), child->getPayloadSize());
@@ -517,7 +518,7 @@ std::size_t KVImageDescAtomBox::writeAtomBox(KVAtomBox const& atom, std::uint8_t
     CFDataRef const data = atom.getPayloadData();
     bool const hasData = data && data->length() == atom.getPayloadSize();
     if (!hasData && atom.getChildCount() == 0 && atom.getPayloadSize() > 0) {
-        // Its range in the source, header included; one that was made here has none.
+        // Its range in the source, header included.
         Bytes const source = sourceBytes(atom.getOffset(), atom.getSize());
         std::copy(source.begin(), source.end(), buffer);
         return source.size();

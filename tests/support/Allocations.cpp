@@ -1,7 +1,9 @@
 #include <support/Allocations.h>
 
+#include <algorithm>
 #include <atomic>
 #include <cstdlib>
+#include <malloc.h>
 #include <new>
 
 namespace {
@@ -9,6 +11,9 @@ namespace {
 std::atomic<long> made{0};
 std::atomic<long> untilFailure{0};
 std::atomic<std::size_t> largest{0};
+std::atomic<long> held{0};
+std::atomic<long> mostHeld{0};
+long heldAtStart = 0;
 
 } // namespace
 
@@ -22,6 +27,17 @@ std::size_t allocations::takeLargest() noexcept
     return largest.exchange(0);
 }
 
+long allocations::peak() noexcept
+{
+    return mostHeld - heldAtStart;
+}
+
+void allocations::startPeak() noexcept
+{
+    heldAtStart = held;
+    mostHeld = heldAtStart;
+}
+
 void allocations::failAt(long number) noexcept
 {
     untilFailure = number;
@@ -30,21 +46,24 @@ void allocations::failAt(long number) noexcept
 void* operator new(std::size_t size)
 {
     ++made;
-    if (size > largest)
-        largest = size;
+    largest = std::max(largest.load(), size);
     if (untilFailure > 0 && --untilFailure == 0)
         throw std::bad_alloc();
-    if (void* const block = std::malloc(size ? size : 1))
-        return block;
-    throw std::bad_alloc();
+    void* const block = std::malloc(size ? size : 1);
+    if (!block)
+        throw std::bad_alloc();
+    held += static_cast<long>(::malloc_usable_size(block));
+    mostHeld = std::max(mostHeld.load(), held.load());
+    return block;
 }
 
 void operator delete(void* block) noexcept
 {
+    held -= static_cast<long>(::malloc_usable_size(block));
     std::free(block);
 }
 
 void operator delete(void* block, std::size_t) noexcept
 {
-    std::free(block);
+    operator delete(block);
 }

@@ -10,6 +10,10 @@ namespace allocations {
 long count() noexcept;
 /// The largest block asked for since the last call of this.
 std::size_t takeLargest() noexcept;
+/// The most bytes that were held at any moment since the last call of `startPeak`, beyond what was
+/// held then.
+long peak() noexcept;
+void startPeak() noexcept;
 /// Lets the `number`th allocation from now throw std::bad_alloc, 1 being the next; 0 lets none.
 void failAt(long number) noexcept;
 

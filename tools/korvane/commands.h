@@ -11,7 +11,15 @@ class App;
 /// A command's work is its callback. It throws ToolError to end with a message and an exit code.
 using AddCommands = void (*)(CLI::App& program);
 
+void addMatrixCommands(CLI::App& program);
+
 // The families, in the order in which `korvane --help` lists them.
 inline constexpr AddCommands commandFamilies[] = {
+    addMatrixCommands,
+void addCaptionsCommands(CLI::App& program);
+
+// The families, in the order in which `korvane --help` lists them.
+inline constexpr AddCommands commandFamilies[] = {
+    addCaptionsCommands,
     nullptr, // the end
 };
