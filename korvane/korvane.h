@@ -120,3 +120,7 @@
 #include <korvane/media/KVAtomMetadataHandler.h>
 #include <korvane/media/KVImageDescAtomBox.h>
 #include <korvane/media/KVXMPStringParser.h>
+
+#include <korvane/compositing/KVBlend.h>
+#include <korvane/compositing/KVFxBlendOptions.h>
+#include <korvane/compositing/KVFxLightWrapOptions.h>

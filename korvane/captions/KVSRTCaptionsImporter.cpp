@@ -152,12 +152,12 @@ void KVSRTCaptionsImporter::takeFontColor(std::u16string_view token)
 
 KVSRTCaptionsImporter::Tag KVSRTCaptionsImporter::_tagFromToken(KVString const& token)
 {
-    KVSubRip::Tag const tag =
+    Tag const tag =
         KVSubRip::tagFromToken(token.view(), KVSubRip::CharacterSet(tagBeginningCharacters_.view()),
                                KVSubRip::CharacterSet(tagEndingCharacters_.view()));
-    if (tag == KVSubRip::font)
+    if (tag == font)
         takeFontColor(token.view());
-    return static_cast<Tag>(tag);
+    return tag;
 }
 
 KVNSRef<NSAttributedString*>
@@ -346,8 +346,12 @@ KVSRTCaptionsImporter::importCaptionsFromString(KVString const& text,
     if (!CMTimeIsNumeric(frameDuration) || frameDuration.timescale < 1)
         frameDuration = kCMTimeInvalid;
 
-    std::u16string const lines = withPlainLineEnds(text.view());
-    std::u16string_view const all = lines;
+    std::u16string_view all = text.view();
+    std::u16string plain;
+    if (all.find(u"\r\n") != all.npos) {
+        plain = withPlainLineEnds(all);
+        all = plain;
+    }
     LineReader reader(all);
     for (double expectedNumber = 1;; ++expectedNumber) {
         std::u16string_view line;

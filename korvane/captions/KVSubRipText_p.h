@@ -1,5 +1,7 @@
 #pragma once
 
+#include <korvane/captions/KVSRTCaptionsImporter.h>
+
 #include <array>
 #include <cstdint>
 #include <optional>
@@ -61,20 +63,8 @@ void tokenize(std::u16string_view text, CharacterSet const& starts, CharacterSet
         emit(text.substr(tokenStart));
 }
 
-/// What a token is; the numbers are those that KVSRTCaptionsImporter answers.
-enum Tag : int {
-    notATag = 0,
-    unknownTag,
-    lineBreak,
-    boldOn,
-    boldOff,
-    italicOn,
-    italicOff,
-    underlineOn,
-    underlineOff,
-    font,
-    fontOff,
-};
+/// What a token is.
+using Tag = KVSRTCaptionsImporter::Tag;
 Tag tagFromToken(std::u16string_view token, CharacterSet const& starts,
                  CharacterSet const& ends) noexcept;
 

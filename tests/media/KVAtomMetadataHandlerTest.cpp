@@ -608,7 +608,8 @@ TEST(KVAtomMetadataHandler, FfprobeReadsWhatIsWritten)
               "max_average=400"})
             EXPECT_THAT(probed, HasSubstr(expected)) << name;
         auto const samples = [](std::string const& path) {
-            return output("ffmpeg -v error -i '" + path + "' -map 0 -c copy -f framemd5 - | sed 's/, S=.*//'");
+            return output("ffmpeg -v error -i '" + path +
+                          "' -map 0 -c copy -f framemd5 - | sed 's/, S=.*//'");
         };
         std::string const before = samples(sampleMovie(name));
         EXPECT_GT(before.size(), 1000u);

@@ -76,6 +76,8 @@ std::vector<std::string> const& plainSamples();
 class Folder {
 public:
     Folder();
+    /// Below another folder than that for temporary files.
+    explicit Folder(std::string const& above);
     ~Folder();
     Folder(Folder const&) = delete;
     Folder& operator=(Folder const&) = delete;
