@@ -25,6 +25,11 @@ constexpr std::size_t elementsOfArena = 16;
 /// What all attributes of a document together may take from entities, in bytes.
 constexpr std::size_t mostFromEntities = 10'000'000;
 
+/// libxml2 collects a tag, a comment or the like whole before it reads it, and goes through all
+/// that it has with every 512 bytes that come once there are ten million.
+constexpr unsigned long long mostOfMarkup = 9'000'000;
+constexpr unsigned long long bytesBetweenChecks = 65536;
+
 char const* chars(xmlChar const* text) noexcept
 {
     return reinterpret_cast<char const*>(text);
@@ -48,6 +53,7 @@ struct KVXMLReadStream::Reader {
     ~Reader() { xmlFreeTextReader(reader); }
 
     void open();
+    static int giveBytes(void* self, char* out, int length);
     bool next();
     unsigned long line() const noexcept;
     void fail(char const* text, unsigned long atLine);
@@ -63,6 +69,9 @@ struct KVXMLReadStream::Reader {
     bool hasNext = false;
     /// The document is given up, whatever libxml2 thinks of it.
     bool failed = false;
+
+    unsigned long long bytesGiven = 0;
+    unsigned long long nextCheck = bytesBetweenChecks;
 
     KVXMLNameCache names;
     std::array<Slot, elementsOfArena> arena;
@@ -82,13 +91,28 @@ void KVXMLReadStream::Reader::open()
         fail(prolog.reason, prolog.line);
         return;
     }
-    auto const read = [](void* bytes, char* out, int length) {
-        return static_cast<KVXMLSource*>(bytes)->read(out, length);
-    };
     auto const close = [](void*) { return 0; };
-    reader = xmlReaderForIO(read, close, &source, nullptr, nullptr, XML_PARSE_HUGE);
+    reader = xmlReaderForIO(giveBytes, close, this, nullptr, nullptr, XML_PARSE_HUGE);
     if (reader)
         xmlTextReaderSetStructuredErrorHandler(reader, keepError, this);
+}
+
+int KVXMLReadStream::Reader::giveBytes(void* self, char* out, int length)
+{
+    auto& giver = *static_cast<Reader*>(self);
+    if (giver.bytesGiven >= giver.nextCheck) {
+        giver.nextCheck = giver.bytesGiven + bytesBetweenChecks;
+        long const consumed = xmlTextReaderByteConsumed(giver.reader);
+        if (consumed >= 0 &&
+            giver.bytesGiven > static_cast<unsigned long long>(consumed) + mostOfMarkup) {
+            giver.fail("a tag or comment is longer than 9000000 bytes",
+                       static_cast<unsigned long>(xmlTextReaderGetParserLineNumber(giver.reader)));
+            return -1;
+        }
+    }
+    int const count = giver.source.read(out, length);
+    giver.bytesGiven += static_cast<unsigned long long>(std::max(count, 0));
+    return count;
 }
 
 /// Goes to the next node, if that has not been done, and answers whether there is one.
@@ -278,6 +302,8 @@ void KVXMLReadStream::startElement()
             auto* const element =
                 static_cast<KVXMLStreamElement*>(createElement(row->elementToken, scope, handler));
             pushElement(element);
+            if (reader.observer)
+                element->line_ = reader.line();
             addAttributes(*element);
             if (xmlTextReaderIsEmptyElement(reader.reader) == 1)
                 endElement();
