@@ -30,5 +30,4 @@ inline constexpr AddCommands commandFamilies[] = {
     addLutCommands,
     addBlendCommands,
     addMediaCommands,
-    nullptr, // the end
 };
