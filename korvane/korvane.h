@@ -14,15 +14,13 @@
 #include <korvane/platform/CMTime.h>
 #include <korvane/platform/CMTimeRange.h>
 #include <korvane/platform/NSAffineTransform.h>
-#include <korvane/platform/NSObject.h>
-#include <korvane/platform/NSRange.h>
-#include <korvane/platform/simd.h>
 #include <korvane/platform/NSAttributedString.h>
 #include <korvane/platform/NSColor.h>
 #include <korvane/platform/NSFont.h>
 #include <korvane/platform/NSObject.h>
 #include <korvane/platform/NSRange.h>
 #include <korvane/platform/NSStringFile.h>
+#include <korvane/platform/simd.h>
 
 #include <korvane/foundation/KVArray.h>
 #include <korvane/foundation/KVCFRef.h>
@@ -74,13 +72,6 @@
 #include <korvane/serialization/KVXMLReadStream.h>
 #include <korvane/serialization/KVXMLStreamElement.h>
 #include <korvane/serialization/KVXMLWriteStream.h>
-#include <korvane/platform/KVKeyedCoder.h>
-#include <korvane/platform/NSCoder.h>
-#include <korvane/platform/NSError.h>
-#include <korvane/cache/KVCache.h>
-#include <korvane/cache/KVCacheImpl.h>
-#include <korvane/cache/KVCachedFunctionImpl.h>
-#include <korvane/cache/KVEvictionHeap.h>
 
 #include <korvane/time/CMTimeRangeAndNonretainedObject.h>
 #include <korvane/time/IntermediateLargeInteger.h>
@@ -93,10 +84,23 @@
 #include <korvane/time/VexTimeRangeObj.h>
 #include <korvane/time/VexTimeRanges.h>
 
+#include <korvane/captions/KVCaption.h>
+#include <korvane/captions/KVCaptionCEA608.h>
+#include <korvane/captions/KVCaptionSRT.h>
+#include <korvane/captions/KVCaptionText.h>
+#include <korvane/captions/KVCaptioniTT.h>
+#include <korvane/captions/KVMutableCaption.h>
+#include <korvane/captions/KVSRTCaptionsExporter.h>
+#include <korvane/captions/KVSRTCaptionsImporter.h>
 #include <korvane/colour/lut_t.h>
 #include <korvane/colour/multilut_t.h>
 #include <korvane/colour/tfreader_t.h>
 #include <korvane/colour/vec_t.h>
+#include <korvane/media/KVAtomBox.h>
+#include <korvane/media/KVAtomBoxFile.h>
+#include <korvane/media/KVAtomMetadataHandler.h>
+#include <korvane/media/KVImageDescAtomBox.h>
+#include <korvane/media/KVXMPStringParser.h>
 #include <korvane/numerics/KVMatrix33Tmpl.h>
 #include <korvane/numerics/KVMatrix44Double.h>
 #include <korvane/numerics/KVMatrix44Measure.h>

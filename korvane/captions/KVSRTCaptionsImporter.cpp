@@ -10,6 +10,8 @@
 #include <korvane/time/KVTime.h>
 #include <korvane/time/KVTimeRange.h>
 
+#include <algorithm>
+#include <array>
 #include <iterator>
 #include <unordered_map>
 
@@ -323,7 +325,8 @@ KVNSRef<NSError*> KVSRTCaptionsImporter::_parseTimecodeString(KVString const& te
     std::optional<double> const value = KVSubRip::parseTimecode(text.view());
     if (!value)
         return makeError(badTimecode);
-    *seconds = *value;
+    if (seconds)
+        *seconds = *value;
     return nullptr;
 }
 
@@ -343,8 +346,8 @@ KVSRTCaptionsImporter::importCaptionsFromString(KVString const& text,
 {
     if (!text.view().starts_with(u'1'))
         return makeError(badFile);
-    if (!CMTimeIsNumeric(frameDuration) || frameDuration.timescale < 1)
-        frameDuration = kCMTimeInvalid;
+    if (!CMTimeIsNumeric(frameDuration))
+        frameDuration = kCMTimeInvalid; // which no time can be made with
 
     std::u16string_view all = text.view();
     std::u16string plain;

@@ -8,7 +8,7 @@
 #include <string>
 #include <string_view>
 
-/// The small grammar of SubRip text, on views of UTF-16. Nothing here allocates or knows captions.
+/// The small grammar of SubRip text, on views of UTF-16; it knows nothing of captions.
 namespace KVSubRip {
 
 /// A few characters, asked for often.

@@ -227,16 +227,18 @@ NSObject const* kv::objectOf(VexTimeRangeObj const* range) noexcept
     return owner ? owner->object() : nullptr;
 }
 
-bool kv::addBySweep(VexTimeRangeArray& array, VexTimeRangeArray const& added, bool keepObjectsApart)
+std::optional<VexTimeRangeArray> kv::addBySweep(VexTimeRangeArray const& array,
+                                                VexTimeRangeArray const& added,
+                                                bool keepObjectsApart)
 {
     std::size_t const count = array.size() + added.size();
     CommonTimescale scale;
     std::vector<Span> spans;
     if (count > greatestCount || !scale.read(array, added, spans))
-        return false;
+        return std::nullopt;
 
     // Ranges have numbers, those that are added behind the others.
-    auto const rangeAt = [&](std::size_t id) -> VexTimeRangeObj* {
+    auto const rangeAt = [&](std::size_t id) -> KVNSRef<VexTimeRangeObj*> const& {
         return id < array.size() ? array[id] : added[id - array.size()];
     };
     // What becomes of a range: it stays, goes, or is replaced by the union of that number.
@@ -281,13 +283,10 @@ bool kv::addBySweep(VexTimeRangeArray& array, VexTimeRangeArray const& added, bo
             continue;
         if (fates[id] != stays)
             result.push_back(rangeAt(id)->copyWithRange(unions[fates[id]]));
-        else if (id < array.size())
-            result.push_back(std::move(array[id]));
         else
-            result.push_back(added[id - array.size()]);
+            result.push_back(rangeAt(id));
     }
-    array = std::move(result);
-    return true;
+    return result;
 }
 
 // --- Subtract ---
@@ -319,12 +318,13 @@ std::vector<Hole> joinedHoles(std::vector<Hole> each)
 
 } // namespace
 
-bool kv::subtractBySweep(VexTimeRangeArray& array, VexTimeRangeArray const& subtracted)
+std::optional<VexTimeRangeArray> kv::subtractBySweep(VexTimeRangeArray const& array,
+                                                     VexTimeRangeArray const& subtracted)
 {
     CommonTimescale scale;
     std::vector<Span> spans;
     if (subtracted.size() > greatestCount || !scale.read(array, subtracted, spans))
-        return false;
+        return std::nullopt;
 
     std::vector<Hole> each; // in the order in which they are given
     each.reserve(subtracted.size());
@@ -343,7 +343,7 @@ bool kv::subtractBySweep(VexTimeRangeArray& array, VexTimeRangeArray const& subt
         auto hole =
             holes.begin() + (std::upper_bound(ends.begin(), ends.end(), start) - ends.begin());
         if (!spans[i].meetsOthers() || hole == holes.end() || hole->start >= end) {
-            result.push_back(std::move(array[i]));
+            result.push_back(array[i]);
             continue;
         }
 
@@ -375,6 +375,5 @@ bool kv::subtractBySweep(VexTimeRangeArray& array, VexTimeRangeArray const& subt
         if (start < end)
             emit(end, [&] { return range->end(); });
     }
-    array = std::move(result);
-    return true;
+    return result;
 }

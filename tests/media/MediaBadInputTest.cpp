@@ -37,9 +37,9 @@ public:
         ASSERT_EQ(handler.openOutputFile(output.cf_url()), 0);
         int const written = handler.writeMetadataWithUpdates();
         ASSERT_TRUE(written == 0 || written == -1) << written;
-        ASSERT_TRUE(readFile(input_) == movie) << "the input is never touched";
+        ASSERT_TRUE(fileBytes(input_) == movie) << "the input is never touched";
         if (written == 0)
-            check(readFile(folder_.path("out")));
+            check(fileBytes(folder_.path("out")));
     }
 
     int written() const { return written_; }
@@ -69,7 +69,7 @@ private:
 TEST(MediaBadInput, AMovieMayEndAnywhere)
 {
     for (char const* name : {"colr.mp4", "quicktime-colr.mov"}) {
-        std::string const movie = readFile(sampleMovie(name));
+        std::string const movie = fileBytes(sampleMovie(name));
         Mill mill(movie);
         ASSERT_EQ(mill.written(), 1);
         std::size_t const media = movie.find("mdat");
@@ -82,7 +82,7 @@ TEST(MediaBadInput, AMovieMayEndAnywhere)
 TEST(MediaBadInput, EachNumberMayBeWrong)
 {
     // Every word of the headers, wherever it starts, one at a time.
-    std::string const movie = readFile(sampleMovie("colr.mp4"));
+    std::string const movie = fileBytes(sampleMovie("colr.mp4"));
     std::size_t const media = movie.find("mdat") + 4;
     Mill mill(movie);
     for (std::size_t position = 0; position < media; ++position)

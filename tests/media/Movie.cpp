@@ -167,7 +167,7 @@ std::vector<std::string> samplesOf(std::string const& movie)
 
 // --- Files ---
 
-std::string readFile(std::string const& path)
+std::string fileBytes(std::string const& path)
 {
     std::ostringstream bytes;
     bytes << std::ifstream(path, std::ios::binary).rdbuf();

@@ -66,7 +66,7 @@ std::vector<std::string> samplesOf(std::string const& movie);
 
 // --- Files ---
 
-std::string readFile(std::string const& path);
+std::string fileBytes(std::string const& path);
 /// One of tests/data/media.
 std::string sampleMovie(std::string const& name);
 /// The names of the sample movies that are not fragmented.

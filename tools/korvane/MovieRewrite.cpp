@@ -119,12 +119,29 @@ bool readChunks(KVAtomBoxFile& file, KVAtomBox const& samples, ChunkTable& table
     return true;
 }
 
+/// Atoms must fill the file and the containers that the library takes apart.
+void checkCoverage(KVAtomBox const& box, std::string const& path)
+{
+    if (box.getChildCount() == 0)
+        return;
+    std::uint64_t end = box.getOffset() + box.getHeaderSize();
+    for (int i = 0; i < box.getChildCount(); ++i) {
+        end += box.getChild(i)->getSize();
+        checkCoverage(*box.getChild(i), path);
+    }
+    if (end != box.getOffset() + box.getSize())
+        throw badInput(path, "the bytes from " + std::to_string(end) +
+                                 " on are no atom: the file is cut short, or holds something else "
+                                 "there");
+}
+
 std::vector<ChunkTable> readTables(std::string const& path)
 {
     KVAtomBoxFile file;
     openMovie(file, path);
     if (file.readAllTrackMediaAtomBoxes() != 0)
         throw badInput(path, "has no moov atom, or more than one");
+    checkCoverage(file, path);
     std::vector<ChunkTable> tables;
     std::vector<KVAtomBox*> tracks;
     file.findAllChildren(tracks, true, KVAtomType("trak"));
@@ -157,22 +174,6 @@ std::vector<ChunkTable> readTables(std::string const& path)
 [[noreturn]] void refuse(std::string const& path, std::string const& reason)
 {
     throw ToolError(ExitCode::Failed, path + ": " + reason + "; nothing was written");
-}
-
-/// Atoms must fill the file and the containers that the library takes apart.
-void checkCoverage(KVAtomBox const& box, std::string const& path)
-{
-    if (box.getChildCount() == 0)
-        return;
-    std::uint64_t end = box.getOffset() + box.getHeaderSize();
-    for (int i = 0; i < box.getChildCount(); ++i) {
-        end += box.getChild(i)->getSize();
-        checkCoverage(*box.getChild(i), path);
-    }
-    if (end != box.getOffset() + box.getSize())
-        throw badInput(path, "the bytes from " + std::to_string(end) +
-                                 " on are no atom: the file is cut short, or holds something else "
-                                 "there; nothing was written");
 }
 
 std::string chunkName(ChunkTable const& table, Chunk const& chunk)
@@ -296,10 +297,6 @@ RewritePlan planRewrite(KVAtomBoxFile& file, std::string const& path)
 
 void checkRewrite(RewritePlan const& plan, std::string const& path)
 {
-    KVAtomBoxFile original;
-    openMovie(original, path);
-    original.readAllTrackMediaAtomBoxes();
-    checkCoverage(original, path);
     checkTables(plan, path);
     checkOtherOffsets(plan, path, FileBytes(path));
 }

@@ -25,12 +25,12 @@ struct RewritePlan {
     long long shift = 0; ///< of every chunk offset
 };
 
-/// Plans the rewrite of `file`, whose tree holds the changes. Throws ToolError with code 3 when the
-/// sample tables of the input can not be read, or lead out of it.
+/// Plans the rewrite of `file`, whose tree holds the changes. Throws ToolError with code 3 when
+/// bytes of the input are in no atom and would be lost, or when its sample tables can not be read
+/// or lead out of it.
 RewritePlan planRewrite(KVAtomBoxFile& file, std::string const& path);
 
-/// Throws ToolError when the rewrite would lose or damage something: code 3 where bytes of the
-/// input are in no atom, code 1 where chunk offsets, or those of fragments, would be wrong
+/// Throws ToolError with code 1 when chunk offsets, or those of fragments, would be wrong
 /// afterwards.
 void checkRewrite(RewritePlan const& plan, std::string const& path);
 

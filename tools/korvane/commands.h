@@ -16,11 +16,15 @@ void addCaptionsCommands(CLI::App& program);
 void addLutCommands(CLI::App& program);
 void addMatrixCommands(CLI::App& program);
 void addMediaCommands(CLI::App& program);
+void addRangesCommands(CLI::App& program);
 void addSceneCommands(CLI::App& program);
+void addTimeCommands(CLI::App& program);
 
 /// The families, in the order in which `korvane --help` lists them.
 inline constexpr AddCommands commandFamilies[] = {
     addSceneCommands,
+    addTimeCommands,
+    addRangesCommands,
     addCaptionsCommands,
     addMatrixCommands,
     addLutCommands,
