@@ -473,6 +473,30 @@ TEST(KVBinaryXMLReadStream, ReadsFromFiles)
     EXPECT_EQ(file.getPos(), bytes.size());
 }
 
+TEST(KVBinaryXMLReadStream, ReadsAcrossTheEndsOfItsWindow)
+{
+    std::string const leaf = element("\3", "\2\2\x0E\1\2\3\4\5\6\7\4\x08\7\x2B\3abc"s);
+    for (std::size_t shift = 0; shift < leaf.size(); ++shift) {
+        std::string const first = element("\x55", std::string(shift, '\xFF'));
+        std::string bytes = header + first;
+        while (bytes.size() < 140000)
+            bytes += leaf;
+        Recorder recorder;
+        long wrong = 0;
+        recorder.onElement = [&](auto&, KVStreamElement& e) {
+            unsigned long long number = 0;
+            int small = 0;
+            e.getAttributeAsUInt64(2, &number);
+            e.getAttributeAsInt32(4, &small);
+            wrong += number != 0x07060504030201 || small != 7;
+        };
+        recorder.follow = false;
+        EXPECT_TRUE(parse(bytes, recorder));
+        EXPECT_EQ(recorder.count, (bytes.size() - header.size() - first.size()) / leaf.size());
+        EXPECT_EQ(wrong, 0) << shift;
+    }
+}
+
 // --- Documents that lie ---
 
 namespace {

@@ -2,6 +2,7 @@
 #include "Json.h"
 #include "ToolError.h"
 #include "commands.h"
+#include "scene/Diff.h"
 #include "scene/SceneFile.h"
 
 #include <korvane/foundation/KVException.h>
@@ -15,6 +16,7 @@
 namespace {
 
 using scene::describe;
+using scene::describeChange;
 using scene::Document;
 using scene::Form;
 using scene::isSet;
@@ -188,6 +190,62 @@ void hash(std::vector<std::string> const& paths, bool json)
     json ? printJson(list) : printOutput(text);
 }
 
+// --- diff ---
+
+std::string textOf(scene::Difference const& difference, std::string const& first,
+                   std::string const& second)
+{
+    using What = scene::Difference::What;
+    std::string const place = difference.path.empty() ? "" : difference.path + ": ";
+    switch (difference.what) {
+    case What::Attribute:
+        return place + difference.name + ": " + describeChange(difference.first, difference.second);
+    case What::Content:
+        return place + describeChange(difference.first, difference.second);
+    case What::OnlyInFirst:
+        return place + "only in " + first + ": " + difference.name;
+    case What::OnlyInSecond:
+        return place + "only in " + second + ": " + difference.name;
+    case What::Order:
+        return place + "in another order";
+    }
+    return place;
+}
+
+Json jsonOf(scene::Difference const& difference)
+{
+    static char const* const names[] = {"attribute", "content", "only in first", "only in second",
+                                        "order"};
+    Json result{{"path", difference.path}, {"what", names[static_cast<int>(difference.what)]}};
+    if (!difference.name.empty())
+        result["name"] = difference.name;
+    if (isSet(difference.first) || isSet(difference.second)) {
+        result["first"] = toJson(difference.first);
+        result["second"] = toJson(difference.second);
+    }
+    return result;
+}
+
+void diff(std::string const& first, std::string const& second, bool json)
+{
+    auto const a = std::make_unique<Document>();
+    auto const b = std::make_unique<Document>();
+    load(first, *a);
+    load(second, *b);
+    Json list = Json::array();
+    std::string text;
+    scene::diff(a->root, b->root, [&](scene::Difference const& difference) {
+        if (json)
+            list.push_back(jsonOf(difference));
+        else
+            text += textOf(difference, first, second) + "\n";
+    });
+    bool const differ = !text.empty() || !list.empty();
+    json ? printJson(list) : printOutput(text);
+    if (differ)
+        throw ToolError(ExitCode::Failed, "");
+}
+
 } // namespace
 
 void addSceneCommands(CLI::App& program)
@@ -232,4 +290,12 @@ void addSceneCommands(CLI::App& program)
         ->required();
     addJsonFlag(hashCommand, options->json);
     hashCommand.callback([options] { hash(options->files, options->json); });
+
+    CLI::App& diffCommand = *family.add_subcommand(
+        "diff", "Say where two documents differ, whatever their forms: nothing if they are alike");
+    diffCommand.add_option("A", options->file, "Document in text or binary form, or -")->required();
+    diffCommand.add_option("B", options->output, "The document to compare it with, or -")
+        ->required();
+    addJsonFlag(diffCommand, options->json);
+    diffCommand.callback([options] { diff(options->file, options->output, options->json); });
 }
