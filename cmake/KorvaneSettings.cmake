@@ -28,6 +28,9 @@ elseif(LLD_PROGRAM)
   add_link_options(-fuse-ld=lld)
 endif()
 
+# A call inside the library stays inside: nobody puts another function in its place.
+add_compile_options(-fno-semantic-interposition)
+
 # The results of floating-point code are part of the interface: no fused
 # multiply-add may be formed behind the source's back.
 add_compile_options(-ffp-contract=off)

@@ -8,6 +8,8 @@ namespace {
 constexpr std::size_t windowSize = 65536;
 /// A document's root element must start within that many bytes.
 constexpr std::size_t mostOfProlog = 1 << 20;
+/// libxml2 moves all that it holds after each kilobyte that it has read: let it not hold much.
+constexpr int mostOfPiece = 1024;
 
 } // namespace
 
@@ -59,7 +61,8 @@ int KVXMLSource::read(char* out, int length)
     std::string_view const left = bytes_.substr(given_);
     if (left.empty())
         return error_ != 0 ? -1 : 0;
-    std::size_t count = std::min(left.size(), static_cast<std::size_t>(length));
+    std::size_t count =
+        std::min(left.size(), static_cast<std::size_t>(std::min(length, mostOfPiece)));
     if (lineByLine_)
         if (std::size_t const newline = left.substr(0, count).find('\n');
             newline != std::string_view::npos)
