@@ -18,6 +18,10 @@
 #include <string>
 #include <vector>
 
+#include <sys/resource.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
 namespace {
 
 constexpr unsigned int children = 3;
@@ -137,7 +141,7 @@ void checkWritten(benchmark::State& state, std::string const& path)
 
 // --- Writing ---
 
-void write(benchmark::State& state)
+void writeText(benchmark::State& state)
 {
     std::string const path = temporaryPath();
     KVURL const url(path.c_str());
@@ -149,7 +153,7 @@ void write(benchmark::State& state)
     countBytes(state, documentSize);
     checkWritten(state, path);
 }
-BENCHMARK(write)->Name("SceneTextWrite/ours")->Unit(benchmark::kMillisecond);
+BENCHMARK(writeText)->Name("SceneTextWrite/ours")->Unit(benchmark::kMillisecond);
 
 /// Text with its special characters replaced, as a careful program that prints would do it.
 std::string escaped(std::string const& text)
@@ -176,51 +180,40 @@ std::string escaped(std::string const& text)
     return out;
 }
 
+/// One call for each tag, tabs included.
 void writePrintf(benchmark::State& state)
 {
+    static char const tabs[] = "\t\t\t\t\t\t\t\t\t\t\t\t";
     std::string const path = temporaryPath();
     for (auto _ : state) {
         std::FILE* const file = std::fopen(path.c_str(), "wb");
-        std::size_t size = static_cast<std::size_t>(
-            std::fprintf(file,
-                         "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<!DOCTYPE vzxmlscene>\n"
-                         "<vzml version=\"%d.%d\">\n\n",
-                         5, 10));
+        std::size_t size = 0;
         auto const count = [&size](int printed) { size += static_cast<std::size_t>(printed); };
-        int tabs = 0;
-        bool open = false;
-        auto const indent = [&] {
-            for (int i = 0; i < tabs; ++i)
-                count(std::fprintf(file, "\t"));
-        };
+        count(std::fprintf(file,
+                           "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<!DOCTYPE vzxmlscene>\n"
+                           "<vzml version=\"%d.%d\">\n\n",
+                           5, 10));
+        int level = 0;
         nest(
             [&](Clip const& clip) {
-                indent();
-                count(std::fprintf(file, "<%s", "clip"));
-                count(std::fprintf(file, " %s=\"%s\"", "name", escaped(clip.name).c_str()));
-                count(std::fprintf(file, " %s=\"%llu\"", "id", clip.id));
-                count(std::fprintf(file, " %s=\"%lld %d %x %lld\"", "start",
+                count(std::fprintf(file,
+                                   "%.*s<clip name=\"%s\" id=\"%llu\" start=\"%lld %d %x %lld\" "
+                                   "gain=\"%.10g\" enabled=\"%d\">\n",
+                                   level, tabs, escaped(clip.name).c_str(), clip.id,
                                    static_cast<long long>(clip.start.value), clip.start.timescale,
-                                   clip.start.flags, static_cast<long long>(clip.start.epoch)));
-                count(std::fprintf(file, " %s=\"%.10g\"", "gain", static_cast<double>(clip.gain)));
-                count(std::fprintf(file, " %s=\"%d\"", "enabled", clip.enabled));
-                count(std::fprintf(file, ">\n"));
-                ++tabs;
-                indent();
-                count(std::fprintf(file, "<%s", "opacity"));
-                count(std::fprintf(file, ">%.17lg", clip.opacity));
-                count(std::fprintf(file, "</%s>\n", "opacity"));
-                open = true;
+                                   clip.start.flags, static_cast<long long>(clip.start.epoch),
+                                   static_cast<double>(clip.gain), clip.enabled));
+                ++level;
+                count(std::fprintf(file, "%.*s<opacity>%.17lg</opacity>\n", level, tabs,
+                                   clip.opacity));
             },
             [&] {
-                --tabs;
-                indent();
-                count(std::fprintf(file, "</%s>\n", "clip"));
+                --level;
+                count(std::fprintf(file, "%.*s</clip>\n", level, tabs));
             },
             [&] { return size >= documentSize; });
         std::fprintf(file, "\n</vzml>\n");
         std::fclose(file);
-        benchmark::DoNotOptimize(open);
     }
     countBytes(state, documentSize);
     checkWritten(state, path);
@@ -308,7 +301,7 @@ std::size_t elementsOfDocument()
     return count;
 }
 
-void read(benchmark::State& state)
+void readText(benchmark::State& state)
 {
     std::string const& text = document();
     std::size_t const expected = 6 * elementsOfDocument();
@@ -321,7 +314,7 @@ void read(benchmark::State& state)
     }
     countBytes(state, text.size());
 }
-BENCHMARK(read)->Name("SceneTextRead/ours")->Unit(benchmark::kMillisecond);
+BENCHMARK(readText)->Name("SceneTextRead/ours")->Unit(benchmark::kMillisecond);
 
 /// The reader by itself: every node, and the text of every attribute and value.
 void readLibxml2(benchmark::State& state)
@@ -380,5 +373,61 @@ void readPugixml(benchmark::State& state)
 }
 BENCHMARK(readPugixml)->Name("SceneTextRead/peer:pugixml")->Unit(benchmark::kMillisecond);
 #endif
+
+// --- Memory ---
+
+long peakKB()
+{
+    rusage usage;
+    getrusage(RUSAGE_SELF, &usage);
+    return usage.ru_maxrss;
+}
+
+/// How much a process of its own grows while it reads a document of that size from a file.
+double grownByReading(std::size_t size)
+{
+    std::string const path = temporaryPath();
+    {
+        KVFileWriteStream file((KVURL(path.c_str())));
+        writeOurs(file, size);
+        file.close();
+    }
+    int pipes[2];
+    if (pipe(pipes) != 0)
+        std::abort();
+    pid_t const child = fork();
+    if (child == 0) {
+        // The peak starts anew at what is in use now.
+        std::ofstream("/proc/self/clear_refs") << 5;
+        long const before = peakKB();
+        KVXMLReadStream stream((KVURL(path.c_str())));
+        Taker taker;
+        stream.pushHandler(&taker);
+        long const grown = stream.parse() ? peakKB() - before : -1;
+        _exit(write(pipes[1], &grown, sizeof grown) == sizeof grown ? 0 : 1);
+    }
+    long grown = -1;
+    if (read(pipes[0], &grown, sizeof grown) != sizeof grown)
+        grown = -1;
+    close(pipes[0]);
+    close(pipes[1]);
+    waitpid(child, nullptr, 0);
+    std::filesystem::remove(path);
+    return grown < 0 ? -1 : static_cast<double>(grown) * 1024;
+}
+
+void readMemory(benchmark::State& state)
+{
+    double small = 0, large = 0;
+    for (auto _ : state) {
+        small = grownByReading(10'000'000);
+        large = grownByReading(100'000'000);
+    }
+    if (small < 0 || large < 0)
+        state.SkipWithError("the document could not be read");
+    state.counters["of10MB"] = small;
+    state.counters["of100MB"] = large;
+}
+BENCHMARK(readMemory)->Name("SceneTextMemory/ours")->Iterations(1)->UseRealTime();
 
 } // namespace

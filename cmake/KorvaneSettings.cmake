@@ -28,17 +28,20 @@ elseif(LLD_PROGRAM)
   add_link_options(-fuse-ld=lld)
 endif()
 
-# A call inside the library stays inside: nobody puts another function in its place.
-add_compile_options(-fno-semantic-interposition)
-
 # The results of floating-point code are part of the interface: no fused
 # multiply-add may be formed behind the source's back.
 add_compile_options(-ffp-contract=off)
+# The library's calls of its own exported functions are bound as it is built, so they may be inlined.
+add_compile_options(-fno-semantic-interposition)
 add_compile_options(-Wall -Wextra -Wpedantic -Wshadow -Wnon-virtual-dtor
                     -Woverloaded-virtual -Wcast-qual -Wformat=2)
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU" AND CMAKE_CXX_COMPILER_VERSION VERSION_LESS 13)
   # g++ 12 sees overlaps inside the standard library's strings where there are none.
   add_compile_options(-Wno-restrict)
+endif()
+if(CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
+  # Unlike g++ it warns of a format that is handed on together with a va_list.
+  add_compile_options(-Wno-format-nonliteral)
 endif()
 if(KORVANE_DEVELOPER)
   add_compile_options(-Werror)
@@ -56,6 +59,10 @@ endif()
 if(KORVANE_SANITIZE)
   add_compile_options(-fsanitize=${KORVANE_SANITIZE} -fno-omit-frame-pointer
                       -fno-sanitize-recover=all)
+  if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+    # The sanitizers' own code hides from g++ what is set where.
+    add_compile_options(-Wno-maybe-uninitialized)
+  endif()
   add_link_options(-fsanitize=${KORVANE_SANITIZE})
 endif()
 if(KORVANE_COVERAGE)

@@ -2,6 +2,7 @@
 
 /// Every public header of the library, floor by floor from the ground.
 
+#include <korvane/platform/AVCaption.h>
 #include <korvane/platform/CFArray.h>
 #include <korvane/platform/CFBase.h>
 #include <korvane/platform/CFBundle.h>
@@ -12,8 +13,14 @@
 #include <korvane/platform/CFURL.h>
 #include <korvane/platform/CMTime.h>
 #include <korvane/platform/CMTimeRange.h>
+#include <korvane/platform/NSAffineTransform.h>
+#include <korvane/platform/NSAttributedString.h>
+#include <korvane/platform/NSColor.h>
+#include <korvane/platform/NSFont.h>
 #include <korvane/platform/NSObject.h>
 #include <korvane/platform/NSRange.h>
+#include <korvane/platform/NSStringFile.h>
+#include <korvane/platform/simd.h>
 
 #include <korvane/foundation/KVArray.h>
 #include <korvane/foundation/KVCFRef.h>
@@ -35,7 +42,18 @@
 #include <korvane/foundation/KVUUID.h>
 #include <korvane/foundation/KVVersion.h>
 
+#include <korvane/cache/KVCache.h>
+#include <korvane/cache/KVCacheImpl.h>
+#include <korvane/cache/KVCachedFunctionImpl.h>
+#include <korvane/cache/KVEvictionHeap.h>
+#include <korvane/platform/KVKeyedCoder.h>
+#include <korvane/platform/NSCoder.h>
+#include <korvane/platform/NSError.h>
 #include <korvane/serialization/KVAsciiStream.h>
+#include <korvane/serialization/KVBinaryXMLField.h>
+#include <korvane/serialization/KVBinaryXMLReadStream.h>
+#include <korvane/serialization/KVBinaryXMLStreamElement.h>
+#include <korvane/serialization/KVBinaryXMLWriteStream.h>
 #include <korvane/serialization/KVBufferReadStream.h>
 #include <korvane/serialization/KVBufferWriteStream.h>
 #include <korvane/serialization/KVByteWriteStream.h>
@@ -54,14 +72,59 @@
 #include <korvane/serialization/KVXMLReadStream.h>
 #include <korvane/serialization/KVXMLStreamElement.h>
 #include <korvane/serialization/KVXMLWriteStream.h>
-#include <korvane/platform/KVKeyedCoder.h>
-#include <korvane/platform/NSCoder.h>
-#include <korvane/platform/NSError.h>
-#include <korvane/cache/KVCache.h>
-#include <korvane/cache/KVCacheImpl.h>
-#include <korvane/cache/KVCachedFunctionImpl.h>
-#include <korvane/cache/KVEvictionHeap.h>
 
+#include <korvane/time/CMTimeRangeAndNonretainedObject.h>
 #include <korvane/time/IntermediateLargeInteger.h>
 #include <korvane/time/KVTime.h>
+#include <korvane/time/KVTimeCoding.h>
 #include <korvane/time/KVTimeRange.h>
+#include <korvane/time/VexTimeObj.h>
+#include <korvane/time/VexTimePairObj.h>
+#include <korvane/time/VexTimeRangeAndObject.h>
+#include <korvane/time/VexTimeRangeObj.h>
+#include <korvane/time/VexTimeRanges.h>
+
+#include <korvane/captions/KVCaption.h>
+#include <korvane/captions/KVCaptionCEA608.h>
+#include <korvane/captions/KVCaptionSRT.h>
+#include <korvane/captions/KVCaptionText.h>
+#include <korvane/captions/KVCaptioniTT.h>
+#include <korvane/captions/KVMutableCaption.h>
+#include <korvane/captions/KVSRTCaptionsExporter.h>
+#include <korvane/captions/KVSRTCaptionsImporter.h>
+#include <korvane/colour/lut_t.h>
+#include <korvane/colour/multilut_t.h>
+#include <korvane/colour/tfreader_t.h>
+#include <korvane/colour/vec_t.h>
+#include <korvane/media/KVAtomBox.h>
+#include <korvane/media/KVAtomBoxFile.h>
+#include <korvane/media/KVAtomMetadataHandler.h>
+#include <korvane/media/KVImageDescAtomBox.h>
+#include <korvane/media/KVXMPStringParser.h>
+#include <korvane/numerics/KVMatrix33Tmpl.h>
+#include <korvane/numerics/KVMatrix44Double.h>
+#include <korvane/numerics/KVMatrix44Measure.h>
+#include <korvane/numerics/KVMatrix44Parameters.h>
+#include <korvane/numerics/KVMatrix44Tmpl.h>
+#include <korvane/numerics/KVQuat.h>
+#include <korvane/numerics/KVRect.h>
+#include <korvane/numerics/KVVector2.h>
+#include <korvane/numerics/KVVector3.h>
+#include <korvane/numerics/KVVector4.h>
+#include <korvane/captions/KVCaption.h>
+#include <korvane/captions/KVCaptionCEA608.h>
+#include <korvane/captions/KVCaptionSRT.h>
+#include <korvane/captions/KVCaptionText.h>
+#include <korvane/captions/KVCaptioniTT.h>
+#include <korvane/captions/KVMutableCaption.h>
+#include <korvane/captions/KVSRTCaptionsExporter.h>
+#include <korvane/captions/KVSRTCaptionsImporter.h>
+#include <korvane/media/KVAtomBox.h>
+#include <korvane/media/KVAtomBoxFile.h>
+#include <korvane/media/KVAtomMetadataHandler.h>
+#include <korvane/media/KVImageDescAtomBox.h>
+#include <korvane/media/KVXMPStringParser.h>
+
+#include <korvane/compositing/KVBlend.h>
+#include <korvane/compositing/KVFxBlendOptions.h>
+#include <korvane/compositing/KVFxLightWrapOptions.h>

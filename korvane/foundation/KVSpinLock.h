@@ -20,8 +20,8 @@ public:
 
 private:
     /// `contended` is taken, with somebody asleep or about to be.
-    enum State : std::uint32_t { free, taken, contended };
+    enum State : std::uint32_t { idle, taken, contended };
     void lockSlowly() noexcept;
 
-    std::atomic<std::uint32_t> state_{free};
+    std::atomic<std::uint32_t> state_{idle};
 };

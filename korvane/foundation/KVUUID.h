@@ -2,6 +2,7 @@
 
 #include <korvane/foundation/KVExport.h>
 
+#include <compare>
 #include <cstdint>
 
 /// 128 bits as four 32-bit words, the first one in front when written.

@@ -1,8 +1,12 @@
 #include <korvane/platform/CFDictionary.h>
 
 #include <algorithm>
+#include <cstddef>
 
 namespace {
+
+/// Up to so many keys, going through them is as fast as an index.
+constexpr std::size_t kSmall = 16;
 
 bool sameText(CFStringRef key, std::string_view ascii) noexcept
 {
@@ -18,6 +22,7 @@ __CFDictionary::__CFDictionary(__CFDictionary const& other) : NSObject(other)
     entries_.reserve(other.entries_.size());
     for (auto const& [key, value] : other.entries_)
         entries_.emplace_back(CFRetain(key), CFRetain(value));
+    indexFrom(0);
 }
 
 __CFDictionary::~__CFDictionary()
@@ -25,12 +30,32 @@ __CFDictionary::~__CFDictionary()
     removeAllValues();
 }
 
+std::size_t __CFDictionary::find(std::u16string_view key) const noexcept
+{
+    if (!index_.empty()) {
+        auto const found = index_.find(key);
+        return found == index_.end() ? kNone : found->second;
+    }
+    for (std::size_t i = 0; i < entries_.size(); ++i)
+        if (entries_[i].first->view() == key)
+            return i;
+    return kNone;
+}
+
+void __CFDictionary::indexFrom(std::size_t place)
+{
+    if (entries_.size() <= kSmall)
+        return index_.clear();
+    if (index_.empty())
+        place = 0;
+    for (; place < entries_.size(); ++place)
+        index_[entries_[place].first->view()] = place;
+}
+
 NSObject const* __CFDictionary::value(CFStringRef key) const noexcept
 {
-    for (auto const& [k, v] : entries_)
-        if (k == key || k->view() == key->view())
-            return v;
-    return nullptr;
+    std::size_t const place = find(key->view());
+    return place == kNone ? nullptr : entries_[place].second;
 }
 
 NSObject const* __CFDictionary::value(std::string_view asciiKey) const noexcept
@@ -45,16 +70,14 @@ void __CFDictionary::setValue(CFStringRef key, NSObject const* value)
 {
     if (!value)
         return removeValue(key);
-    for (auto& [k, v] : entries_) {
-        if (k->view() != key->view())
-            continue;
-        CFRetain(value);
-        std::swap(v, value);
+    std::size_t const place = find(key->view());
+    CFRetain(value);
+    if (place != kNone) {
+        std::swap(entries_[place].second, value);
         return CFRelease(value);
     }
-    entries_.emplace_back(key, value);
-    CFRetain(key);
-    CFRetain(value);
+    entries_.emplace_back(CFRetain(key), value);
+    indexFrom(entries_.size() - 1);
 }
 
 void __CFDictionary::setValue(std::string_view asciiKey, NSObject const* value)
@@ -66,19 +89,20 @@ void __CFDictionary::setValue(std::string_view asciiKey, NSObject const* value)
 
 void __CFDictionary::removeValue(CFStringRef key)
 {
-    auto found = std::find_if(entries_.begin(), entries_.end(), [&](auto const& entry) {
-        return entry.first->view() == key->view();
-    });
-    if (found == entries_.end())
+    std::size_t const place = find(key->view());
+    if (place == kNone)
         return;
-    auto const [k, v] = *found;
-    entries_.erase(found);
+    auto const [k, v] = entries_[place];
+    index_.clear();
+    entries_.erase(entries_.begin() + static_cast<std::ptrdiff_t>(place));
+    indexFrom(0);
     CFRelease(k);
     CFRelease(v);
 }
 
 void __CFDictionary::removeAllValues() noexcept
 {
+    index_.clear();
     auto entries = std::move(entries_);
     entries_.clear();
     for (auto const& [key, value] : entries) {

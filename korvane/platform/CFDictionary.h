@@ -3,6 +3,7 @@
 #include <korvane/platform/CFString.h>
 
 #include <string_view>
+#include <unordered_map>
 #include <utility>
 #include <vector>
 
@@ -37,7 +38,16 @@ struct KV_EXPORT __CFDictionary final : NSObject {
     KVString description() const override;
 
 private:
+    static constexpr std::size_t kNone = static_cast<std::size_t>(-1);
+
+    /// The place of the key, or kNone.
+    std::size_t find(std::u16string_view key) const noexcept;
+    void indexFrom(std::size_t place);
+
     std::vector<std::pair<CFStringRef, NSObject const*>> entries_;
+    /// The places of the keys, once there are so many that going through them would be slow. The
+    /// texts are those of the keys.
+    std::unordered_map<std::u16string_view, std::size_t> index_;
 };
 
 using CFDictionaryRef = __CFDictionary const*;

@@ -88,6 +88,10 @@ KV_EXPORT CFStringRef CFStringCreateCapitalized(CFStringRef);
 KV_EXPORT CFStringRef CFStringCreateWithoutDiacritics(CFStringRef);
 /// Number of extended grapheme clusters (UAX #29).
 KV_EXPORT std::size_t CFStringGetGraphemeCount(CFStringRef);
+/// The first boundary between extended grapheme clusters at or behind `index`; `start`, a boundary
+/// at or before it, is where they are counted from.
+KV_EXPORT std::size_t CFStringGetGraphemeBoundary(std::u16string_view units, std::size_t start,
+                                                  std::size_t index);
 /// Zs or the tab; U+000A to U+000D, U+0085, U+2028, U+2029.
 KV_EXPORT bool CFCharacterIsWhitespace(char16_t) noexcept;
 KV_EXPORT bool CFCharacterIsNewline(char16_t) noexcept;

@@ -125,9 +125,49 @@ std::size_t CFStringGetGraphemeCount(CFStringRef string)
     return count;
 }
 
+namespace {
+
+/// Whether two neighbours are sure to belong to different clusters, by their classes alone.
+bool surelyParts(std::u16string_view units, std::size_t index)
+{
+    char16_t const before = units[index - 1];
+    char16_t const after = units[index];
+    if (before < 0x300 && after < 0x300)
+        return before != u'\r' || after != u'\n';
+    if (U16_IS_SURROGATE(before) || U16_IS_SURROGATE(after))
+        return false;
+    auto const isOther = [](char16_t unit) {
+        return u_getIntPropertyValue(unit, UCHAR_GRAPHEME_CLUSTER_BREAK) == U_GCB_OTHER;
+    };
+    return isOther(before) && isOther(after);
+}
+
+} // namespace
+
+std::size_t CFStringGetGraphemeBoundary(std::u16string_view units, std::size_t start,
+                                        std::size_t index)
+{
+    if (index <= start || index >= units.size() || surelyParts(units, index))
+        return std::min(index, units.size());
+    UErrorCode status = U_ZERO_ERROR;
+    // Costly to make, and not to be used by two threads at once.
+    thread_local std::unique_ptr<icu::BreakIterator> const breaks(
+        icu::BreakIterator::createCharacterInstance(icu::Locale::getRoot(), status));
+    if (!breaks)
+        return index;
+    icu::UnicodeString const text = aliasOf(units.substr(start));
+    breaks->setText(text);
+    std::size_t boundary = start;
+    while (boundary < index)
+        boundary = start + static_cast<std::size_t>(breaks->next());
+    return boundary;
+}
+
 bool CFCharacterIsWhitespace(char16_t unit) noexcept
 {
-    return unit == u'\t' || u_charType(unit) == U_SPACE_SEPARATOR;
+    if (unit < 0x80)
+        return unit == u' ' || unit == u'\t';
+    return u_charType(unit) == U_SPACE_SEPARATOR;
 }
 
 bool CFCharacterIsNewline(char16_t unit) noexcept

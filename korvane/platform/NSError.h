@@ -4,6 +4,10 @@
 #include <korvane/foundation/KVString.h>
 #include <korvane/platform/CFDictionary.h>
 
+/// Names of details: what happened, and why, for a person to read.
+inline constexpr char NSLocalizedDescriptionKey[] = "NSLocalizedDescription";
+inline constexpr char NSLocalizedFailureReasonErrorKey[] = "NSLocalizedFailureReason";
+
 /// Why an operation failed: a domain, a code within it, and details by name. An operation that may
 /// fail returns a holder, null for success.
 class KV_EXPORT NSError final : public NSObject {

@@ -86,6 +86,8 @@ void KVSerializerReadStream::popElement()
 
 void KVSerializerReadStream::popAllElements()
 {
+    // Handlers that are left would have to be searched for every element that goes.
+    handlers_.clear();
     while (!elements_.empty())
         popElement();
 }

@@ -139,8 +139,8 @@ public:
     bool getAttributeAsVexTime(KVStreamElement const& element, unsigned int token, CMTime* value);
 
 protected:
-    /// Pops all elements. A derived reader that overrides `destroyElement` calls this in its own
-    /// destructor.
+    /// Pops all elements and lets all handlers go, without `parseEnd`. A derived reader that
+    /// overrides `destroyElement` calls this in its own destructor.
     void popAllElements();
     /// The tables of the top handler; there must be one.
     std::vector<KVScope*> const& currentScopes() const noexcept { return handlers_.back().scopes; }

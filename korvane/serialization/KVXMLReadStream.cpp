@@ -311,7 +311,10 @@ void KVXMLReadStream::startElement()
             if (!row)
                 continue;
             pushElement(createElement(row->elementToken, table, handler));
-            addAttributes(static_cast<KVXMLStreamElement&>(*currentElement()));
+            auto& element = static_cast<KVXMLStreamElement&>(*currentElement());
+            if (reader.observer)
+                element.line_ = reader.line();
+            addAttributes(element);
             if (xmlTextReaderIsEmptyElement(reader.reader) == 1)
                 endElement();
             return;

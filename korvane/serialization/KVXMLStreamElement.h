@@ -51,6 +51,8 @@ public:
     bool getAttributeAsBool(unsigned int attribute, bool* value) const override;
     KVUUID* getAttributeAsUUID(unsigned int attribute) const override;
     bool getAttributeAsVexTime(unsigned int attribute, CMTime* value) const override;
+    /// The line of the element's start tag, in a stream with an observer; else 0.
+    unsigned long line() const noexcept { return line_; }
     /// The value in UTF-8, null when the attribute is absent; valid until another one is added.
     char const* getAttributeAsCString(unsigned int attribute) const noexcept;
 
@@ -93,6 +95,7 @@ private:
     KVString stringValue_;
     /// Where the next typed getter reads, in the content.
     std::size_t cursor_ = 0;
+    unsigned long line_ = 0;
     bool hasContent_ = false;
     std::unique_ptr<Storage> ownStorage_;
     Storage& storage_;

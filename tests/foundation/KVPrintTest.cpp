@@ -79,6 +79,7 @@ TEST(KVPrint, GoesToALogFileIfTheEnvironmentAsks)
 TEST(KVPrint, DoesNotFollowAPlantedLink)
 {
     std::string const target = testing::TempDir() + "kvprint-target";
+    std::filesystem::remove(target);
     pid_t const child = inChild([&] {
         setenv("kvPrintUseLogFile", "1", 1);
         std::filesystem::create_symlink(target, logPath(getpid()));

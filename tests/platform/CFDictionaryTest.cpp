@@ -31,6 +31,28 @@ TEST(CFDictionary, ReplacingAValueByItselfKeepsIt)
     EXPECT_EQ(dictionary->value("k")->description(), "7");
 }
 
+TEST(CFDictionary, LargeOnesFindTheirKeysAfterEveryChange)
+{
+    auto key = [](int i) { return "key " + std::to_string(i); };
+    auto const dictionary = KVMakeRef<__CFDictionary>();
+    for (int i = 0; i < 40; ++i)
+        dictionary->setValue(key(i), KVMakeRef<NSNumber>(i));
+    auto const copy = KVMakeRef<__CFDictionary>(*dictionary);
+    // Down past the size at which they no longer keep an index, and up again.
+    for (int removed = 0; removed < 35; ++removed) {
+        dictionary->setValue(key(removed), nullptr);
+        for (int i = 0; i < 40; ++i)
+            ASSERT_EQ(dictionary->value(KVString(key(i)).cf_str()) != nullptr, i > removed);
+    }
+    for (int i = 0; i < 40; ++i)
+        dictionary->setValue(key(i), KVMakeRef<NSNumber>(i));
+    EXPECT_EQ(dictionary->count(), 40u);
+    EXPECT_EQ(dictionary->keyAtIndex(0)->description().toUTF8(), key(35));
+    EXPECT_TRUE(CFEqual(copy, dictionary));
+    dictionary->removeAllValues();
+    EXPECT_FALSE(dictionary->value(KVString(key(1)).cf_str()));
+}
+
 TEST(CFData, CopiesAreTheirOwn)
 {
     auto const data = KVCFRef<CFMutableDataRef>::adopt(CFDataCreateMutable(nullptr, 0));

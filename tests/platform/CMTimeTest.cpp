@@ -147,8 +147,8 @@ TEST(CMTime, MultipliesByTheExactValueOfADouble)
         double factor;
         CMTime product;
     } const rows[] = {
-        {T(4, 600), 0.5, T(2, 600)},      // on its own timescale if it can be
-        {T(1, 600), 0.5, T(1, 1200)},     // else as a reduced fraction
+        {T(4, 600), 0.5, T(2, 600)},  // on its own timescale if it can be
+        {T(1, 600), 0.5, T(1, 1200)}, // else as a reduced fraction
         {T(3, 600), 0.25, T(1, 800)},
         {T(1, 3), 3, T(3, 3)},
         {T(1, 1), 0.1, T(6554, 65536, rounded)}, // else on 65536 or more

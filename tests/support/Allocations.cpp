@@ -1,19 +1,41 @@
 #include <support/Allocations.h>
 
+#include <algorithm>
 #include <atomic>
 #include <cstdlib>
+#include <malloc.h>
 #include <new>
 
 namespace {
 
 std::atomic<long> made{0};
 std::atomic<long> untilFailure{0};
+std::atomic<std::size_t> largest{0};
+std::atomic<long> held{0};
+std::atomic<long> mostHeld{0};
+long heldAtStart = 0;
 
 } // namespace
 
 long allocations::count() noexcept
 {
     return made;
+}
+
+std::size_t allocations::takeLargest() noexcept
+{
+    return largest.exchange(0);
+}
+
+long allocations::peak() noexcept
+{
+    return mostHeld - heldAtStart;
+}
+
+void allocations::startPeak() noexcept
+{
+    heldAtStart = held;
+    mostHeld = heldAtStart;
 }
 
 void allocations::failAt(long number) noexcept
@@ -24,19 +46,24 @@ void allocations::failAt(long number) noexcept
 void* operator new(std::size_t size)
 {
     ++made;
+    largest = std::max(largest.load(), size);
     if (untilFailure > 0 && --untilFailure == 0)
         throw std::bad_alloc();
-    if (void* const block = std::malloc(size ? size : 1))
-        return block;
-    throw std::bad_alloc();
+    void* const block = std::malloc(size ? size : 1);
+    if (!block)
+        throw std::bad_alloc();
+    held += static_cast<long>(::malloc_usable_size(block));
+    mostHeld = std::max(mostHeld.load(), held.load());
+    return block;
 }
 
 void operator delete(void* block) noexcept
 {
+    held -= static_cast<long>(::malloc_usable_size(block));
     std::free(block);
 }
 
 void operator delete(void* block, std::size_t) noexcept
 {
-    std::free(block);
+    operator delete(block);
 }

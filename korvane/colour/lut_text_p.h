@@ -1,0 +1,69 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <string_view>
+
+// The words and numbers of LUT files.
+
+namespace cc {
+
+/// Whether a header line is `key`, white space and a value, which may be empty. Lines of more than
+/// 4096 bytes are no header lines.
+bool tok(std::string_view line, std::string_view key, std::string_view& value);
+
+/// Whether the text holds "pandora 3d lut file" or "3d cube file", in letters of any case.
+bool namesMGA(std::string_view text);
+
+/// What stands between the first and the last quote of a line; false unless there are two.
+bool quoted(std::string_view line, std::string_view& text);
+
+/// Finds the first place where `count` (at most 3) numbers follow each other, with or without white
+/// space between them. A number is [-+]?\d*\.?\d+; the longest that lets all of them match is
+/// taken, the first one first. So "100" holds the three numbers 1, 0 and 0.
+bool findNumbers(std::string_view text, int count, float* numbers);
+/// The same for three words of letters, digits and underscores.
+bool findWords(std::string_view text, std::string_view (&words)[3]);
+
+/// The decimal integer at the start of the text, as `strtol` reads it; 0 for none.
+long long leadingInteger(std::string_view text) noexcept;
+
+/// Reads the next number of a data row and moves behind it, to the next space or tab or to `end`.
+/// What is no number is 0; a number ends where it stops being one, and what follows it up to the
+/// blank is passed over. The result is the float nearest to the decimal, infinite beyond its range.
+float qdcstr2float(char const*& at, char const* end) noexcept;
+
+/// Reads decimal digits behind spaces and tabs, modulo 2^64; 0 where there are none.
+std::uint64_t qdcstr2unsigned(char const*& at, char const* end) noexcept;
+
+/// Text on its way to a file, handed over in blocks. After a failed write the rest is dropped.
+class lut_output_t {
+public:
+    explicit lut_output_t(int fd) : fd_(fd), block_(std::make_unique<char[]>(kBlock)) {}
+
+    lut_output_t& operator<<(std::string_view text);
+    lut_output_t& operator<<(char character);
+    lut_output_t& operator<<(std::uint64_t number);
+    /// As "%f" prints it: six digits behind the point, rounded half to even.
+    lut_output_t& operator<<(float number);
+
+    /// Writes what is left; the `errno` of the first failure, 0 for none.
+    int finish();
+
+private:
+    static constexpr std::size_t kBlock = std::size_t(1) << 16;
+    /// The longest number: a sign, the 39 digits of the largest float, a point, six digits.
+    static constexpr std::size_t kLongestNumber = 47;
+
+    /// Where the next `size` bytes go, at most kBlock.
+    char* room(std::size_t size);
+    void flush();
+
+    int fd_;
+    int error_ = 0;
+    std::size_t used_ = 0;
+    std::unique_ptr<char[]> block_;
+};
+
+} // namespace cc

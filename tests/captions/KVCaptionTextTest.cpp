@@ -1,0 +1,199 @@
+#include "Captions.h"
+
+#include <gtest/gtest.h>
+
+#include <chrono>
+
+namespace {
+
+// --- Black background, styled text ---
+
+TEST(StringWithBlackBackground, TakesTheTextColoursSpaceAtTheStart)
+{
+    auto const text = KVMakeRef<NSMutableAttributedString>(KVString("abc"));
+    text->addAttribute(NSForegroundColorAttributeName, KVMakeRef<NSColor>(1, 0, 0, 1, "P3"),
+                       {0, 1});
+    text->addAttribute(NSForegroundColorAttributeName, NSColor::whiteColor(), {1, 2});
+    auto const black = stringWithBlackBackground(text);
+    NSRange range;
+    EXPECT_TRUE(black->attribute(NSBackgroundColorAttributeName, 2, &range)
+                    ->isEqual(KVMakeRef<NSColor>(0, 0, 0, 1, "P3")));
+    EXPECT_EQ(range, (NSRange{0, 3}));
+    EXPECT_FALSE(text->attribute(NSBackgroundColorAttributeName, 0))
+        << "the argument is left alone";
+
+    EXPECT_TRUE(stringWithBlackBackground(KVMakeRef<NSAttributedString>("a"))
+                    ->attribute(NSBackgroundColorAttributeName, 0)
+                    ->isEqual(NSColor::blackColor()));
+    EXPECT_TRUE(stringWithBlackBackground(KVMakeRef<NSAttributedString>())->runs().empty());
+    EXPECT_FALSE(stringWithBlackBackground(nullptr));
+}
+
+TEST(KVAttributedStringFromCaption, GivesEveryUnitTheSystemFontAndItsStyles)
+{
+    KVMutableCaption caption(KVMakeRef<NSAttributedString>("abcdef"), rangeOf(0, 1));
+    caption.setFontWeight(2, {0, 2});
+    caption.setFontStyle(2, {1, 2});
+    caption.setFontDecoration(1, {5, 1});
+    caption.setTextColor(NSColor::named("red"), {0, 3});
+    auto const text = KVAttributedStringFromCaption(&caption);
+    EXPECT_EQ(text->string().toUTF8(), "abcdef");
+    EXPECT_EQ(stylesOf(text), "132004");
+    EXPECT_EQ(coloursOf(text), "ff0000,-");
+    EXPECT_EQ(text->attribute(NSFontAttributeName, 4), NSFont::systemFont());
+
+    EXPECT_FALSE(KVAttributedStringFromCaption(static_cast<KVCaption*>(nullptr)));
+    EXPECT_FALSE(KVAttributedStringFromCaption(static_cast<AVCaption*>(nullptr)));
+    KVCaption const none(nullptr, rangeOf(0, 1));
+    EXPECT_EQ(KVAttributedStringFromCaption(&none)->length(), 0u);
+}
+
+// --- Conversions ---
+
+TEST(KVCaptionConversion, EachFormatComesBackFromThePlayersModel)
+{
+    KVCaption const styled(KVMakeRef<NSAttributedString>("漢字"), rangeOf(3, 5));
+    auto const text = KVAttributedStringFromCaption(&styled);
+    KVMutableCaptioniTT timed(text, rangeOf(3, 5), "top");
+    timed.setRubyText("かんじ", {0, 2});
+    KVCaptionSRT const subRip(text, rangeOf(3, 5));
+    KVCaptionCEA608 const cells(text, rangeOf(3, 5), 4, 12, 1, 7, 8);
+    for (KVCaption const* caption :
+         {static_cast<KVCaption const*>(&timed), static_cast<KVCaption const*>(&subRip),
+          static_cast<KVCaption const*>(&cells)}) {
+        auto const model = KVCaptionToAVCaption(caption);
+        ASSERT_TRUE(model);
+        EXPECT_TRUE(KVCaptionFromAVCaption(model)->isEqual(caption)) << caption->format();
+    }
+    auto const model = KVCaptionToAVCaption(&timed);
+    ASSERT_EQ(model->rubyRuns().size(), 1u);
+    EXPECT_EQ(model->rubyRuns()[0].range, (NSRange{0, 2}));
+    EXPECT_EQ(KVCaptionToAVCaption(&cells)->animation(), 7);
+}
+
+TEST(KVCaptionConversion, TheRegionFollowsTheFormat)
+{
+    auto const text = KVMakeRef<NSAttributedString>("a");
+    auto const bottom = AVCaptionRegion::subRipTextBottomRegion();
+    auto const regionOf = [](auto const& caption) {
+        return AVCaptionRegionFromKVCaption(&caption);
+    };
+    EXPECT_TRUE(regionOf(KVCaption(text, rangeOf(0, 1)))->isEqual(bottom));
+    EXPECT_TRUE(regionOf(KVCaptionSRT(text, rangeOf(0, 1)))->isEqual(bottom));
+    EXPECT_TRUE(regionOf(KVCaptionCEA608(text, rangeOf(0, 1), 4, 12, 2, 7, 8))
+                    ->isEqual(AVCaptionRegion::regionWithCells(4, 12, 2, 8)));
+    EXPECT_TRUE(regionOf(KVCaptioniTT(text, rangeOf(0, 1), "top"))
+                    ->isEqual(AVCaptionRegion::regionWithIdentifier("top")));
+    EXPECT_FALSE(AVCaptionRegionFromKVCaption(nullptr));
+    EXPECT_FALSE(KVCaptionToAVCaption(nullptr));
+    EXPECT_FALSE(KVCaptionFromAVCaption(nullptr));
+    KVSetRubyFromAVCaption(nullptr, nullptr);
+    KVSetAttributedStringToCaption(nullptr, nullptr);
+
+    AVCaption const placeless("a", rangeOf(0, 1));
+    EXPECT_EQ(KVCaptionFromAVCaption(&placeless)->format(), 3);
+}
+
+TEST(AVCaption, RubyIsKeptInOrderWithinTheText)
+{
+    AVCaption caption("abcdef", rangeOf(0, 1));
+    auto const ruby = KVMakeRef<AVCaptionRuby>("r");
+    caption.addRuby(ruby, {1, 2});
+    caption.addRuby(ruby, {2, 2});        // begins within the one before: cut to {3, 1}
+    caption.addRuby(ruby, {0, 1});        // lies before it: ignored
+    caption.addRuby(ruby, {SIZE_MAX, 4}); // beyond the text
+    caption.addRuby(ruby, {5, SIZE_MAX});
+    ASSERT_EQ(caption.rubyRuns().size(), 3u);
+    EXPECT_EQ(caption.rubyRuns()[1].range, (NSRange{3, 1}));
+    EXPECT_EQ(caption.rubyRuns()[2].range, (NSRange{5, 1}));
+}
+
+// --- Groups ---
+
+/// "0-2 5-6": captions from and to seconds; the text is the row's position unless a letter stands
+/// before the times.
+KVCaptionArray captionsOf(std::string const& rows)
+{
+    KVCaptionArray captions;
+    std::istringstream in(rows);
+    for (std::string row; in >> row;) {
+        std::string text = std::to_string(captions.size());
+        if (std::isalpha(static_cast<unsigned char>(row[0]))) {
+            text = row.substr(0, 1);
+            row.erase(0, 1);
+        }
+        std::size_t const dash = row.find('-');
+        captions.push_back(KVMakeRef<KVCaption>(
+            KVMakeRef<NSAttributedString>(text.c_str()),
+            rangeOf(std::stoll(row.substr(0, dash)), std::stoll(row.substr(dash + 1)))));
+    }
+    return captions;
+}
+
+/// The texts of the groups: "0 1|2".
+std::string groupsOf(std::string const& rows, bool includeTouching)
+{
+    std::string result;
+    for (KVCaptionArray const& group :
+         KVGroupOverlappingCaptions(captionsOf(rows), includeTouching)) {
+        result += result.empty() ? "" : "|";
+        for (KVCaption const* caption : group)
+            result += caption->text().toUTF8() + (caption == group.back() ? "" : " ");
+    }
+    return result;
+}
+
+TEST(KVGroupOverlappingCaptions, JoinsWhatStartsBeforeTheGroupsEnd)
+{
+    struct Row {
+        char const* captions;
+        char const* apart;
+        char const* touching;
+    } const rows[] = {
+        {"", "", ""},
+        {"0-2 2-3 5-6", "0|1|2", "0 1|2"},
+        {"0-10 1-2 3-4", "0 1 2", "0 1 2"},
+        {"0-2 1-4 3-5 5-6", "0 1 2|3", "0 1 2 3"},
+        // One of no length begins a group all the same, and joins one that is open.
+        {"5-5 6-7", "0|1", "0|1"},
+        {"0-9 5-5", "0 1", "0 1"},
+        // Equals join together...
+        {"a0-2 a0-2 b1-3", "a a b", "a a b"},
+        // ...or, where only one joins, leave together: these do not overlap themselves.
+        {"a5-5 a5-5 b6-7", "a|b", "a a|b"},
+        // An equal later in an unsorted row leaves as well.
+        {"a0-2 b5-6 a0-2", "a|b", "a|b"},
+    };
+    for (Row const& row : rows) {
+        EXPECT_EQ(groupsOf(row.captions, false), row.apart) << row.captions;
+        EXPECT_EQ(groupsOf(row.captions, true), row.touching) << row.captions;
+    }
+    EXPECT_EQ(KVGroupOverlappingCaptions({nullptr, captionsOf("0-1")[0], nullptr}, false).size(),
+              1u);
+}
+
+TEST(KVGroupOverlappingCaptions, TakesTimeInProportionWhateverTheOverlaps)
+{
+    auto const text = KVMakeRef<NSAttributedString>("one text for all");
+    // All apart, all in one group, all equal, all alike but for the cell.
+    using Make = KVNSRef<KVCaption*> (*)(NSAttributedString const*, int);
+    Make const makes[] = {
+        [](auto const* t, int i) { return KVMakeRef<KVCaption>(t, rangeOf(i, i + 1)); },
+        [](auto const* t, int i) { return KVMakeRef<KVCaption>(t, rangeOf(i, 1'000'000)); },
+        [](auto const* t, int) { return KVMakeRef<KVCaption>(t, rangeOf(5, 5)); },
+        [](auto const* t, int i) -> KVNSRef<KVCaption*> {
+            return KVMakeRef<KVCaptionCEA608>(t, rangeOf(5, 5), i, 0, 1, 0, 0);
+        },
+    };
+    for (Make make : makes) {
+        KVCaptionArray captions;
+        for (int i = 0; i < 50'000; ++i)
+            captions.push_back(make(text, i));
+        auto const start = std::chrono::steady_clock::now();
+        EXPECT_FALSE(KVGroupOverlappingCaptions(captions, false).empty());
+        // A pass over the rest for each caption would take minutes.
+        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(10));
+    }
+}
+
+} // namespace

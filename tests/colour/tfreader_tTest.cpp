@@ -1,0 +1,180 @@
+#include <korvane/colour/tfreader_t.h>
+
+#include <support/TemporaryFolder.h>
+
+#include <gtest/gtest.h>
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include <unistd.h>
+
+namespace {
+
+using namespace std::string_literals;
+using Lines = std::vector<std::string>;
+
+Lines linesOf(std::string_view bytes, int encoding = cc::tfreader_t::kUTF8)
+{
+    TemporaryFolder const folder;
+    cc::tfreader_t reader(encoding);
+    EXPECT_EQ(reader.open(folder.write("text", bytes).c_str()), cc::kSuccess);
+    Lines lines;
+    for (std::string line; reader.readln(line);)
+        lines.push_back(line);
+    return lines;
+}
+
+TEST(tfreader_t, EveryEndingEndsALineAndPairsAreOne)
+{
+    struct Row {
+        std::string bytes;
+        Lines lines;
+    } const rows[] = {
+        {"", {}},
+        {"\n", {""}},
+        {"a", {"a"}},
+        {"a\nb", {"a", "b"}},
+        {"a\rb\r", {"a", "b"}},
+        {"a\r\nb\r\n", {"a", "b"}},
+        {"a\n\rb\n\r", {"a", "b"}},
+        {"a\n\nb", {"a", "", "b"}},
+        {"a\r\rb", {"a", "", "b"}},
+        {"a\r\n\r\nb", {"a", "", "b"}},
+        {"a\n\r\nb", {"a", "", "b"}},
+        {"a\r\n\n\rb", {"a", "", "b"}},
+        {"a\0b\n"s, {"a\0b"s}},
+        {"\xEF\xBB\xBF"
+         "a\n",
+         {"a"}},
+        {"a\n\xEF\xBB\xBF", {"a", "\xEF\xBB\xBF"}},
+    };
+    for (auto const& row : rows)
+        EXPECT_EQ(linesOf(row.bytes), row.lines) << row.bytes;
+}
+
+TEST(tfreader_t, LinesGoAcrossTheBuffersEnd)
+{
+    // An ending that is cut by the end of the 4096 bytes, or lies just beside it.
+    for (std::size_t const length : {4094u, 4095u, 4096u, 4097u, 8190u, 8191u, 8192u, 20000u}) {
+        std::string const text(length, 'x');
+        for (char const* const ending : {"\r\n", "\n\r", "\n", "\r"})
+            EXPECT_EQ(linesOf(text + ending + "b" + ending), (Lines{text, "b"})) << length;
+        EXPECT_EQ(linesOf("a\n" + text), (Lines{"a", text})) << length;
+    }
+}
+
+TEST(tfreader_t, OtherEncodingsComeOutAsUTF8)
+{
+    struct Row {
+        int encoding;
+        std::string bytes;
+        Lines lines;
+    } const rows[] = {
+        {cc::tfreader_t::kMacRoman, "caf\x8E\r\xF0\r", {"café", "\xEF\xA3\xBF"}},
+        {cc::tfreader_t::kUTF16,
+         "\xFF\xFE"
+         "a\0\r\0\n\0b\0"s,
+         {"a", "b"}},
+        {cc::tfreader_t::kUTF16, "\xFE\xFF\0a\0\n\0\r\0b"s, {"a", "b"}},
+        {cc::tfreader_t::kUTF16, "\xFE\xFF\0\xE9\0\n\0\n"s, {"é", ""}},
+        {cc::tfreader_t::kUTF16, "\xFE\xFF\0a\x0D\x0A\0b"s, {"a", "b"}}, // two single bytes
+        {cc::tfreader_t::kUTF16, "\xFE\xFF\xD8\x3D\xDE\x00\xD8\x3D"s, {"\U0001F600\uFFFD"}},
+        {cc::tfreader_t::kUTF16,
+         "\xFF\xFE"
+         "a\0b"s,
+         {"a"}}, // half a unit at the end
+        {cc::tfreader_t::kUTF16, "\xFF\xFE"s, {}},
+    };
+    for (auto const& row : rows)
+        EXPECT_EQ(linesOf(row.bytes, row.encoding), row.lines);
+
+    std::string const text(3000, 'y');
+    std::string units = "\xFE\xFF";
+    for (char const c : text + "\r\n" + text)
+        units += {'\0', c};
+    EXPECT_EQ(linesOf(units, cc::tfreader_t::kUTF16), (Lines{text, text}));
+}
+
+TEST(tfreader_t, UTF16WithoutAMarkIsInTheOrderThatIsSet)
+{
+    TemporaryFolder const folder;
+    char16_t const units[] = u"a\nb";
+    std::string bytes(reinterpret_cast<char const*>(units), 6);
+    cc::tfreader_t reader(cc::tfreader_t::kUTF16);
+    std::string line;
+    ASSERT_EQ(reader.open(folder.write("native", bytes).c_str()), cc::kSuccess);
+    EXPECT_TRUE(reader.readln(line));
+    EXPECT_EQ(line, "a");
+    reader.close();
+    for (std::size_t i = 0; i < bytes.size(); i += 2)
+        std::swap(bytes[i], bytes[i + 1]);
+    ASSERT_EQ(reader.open(folder.write("swapped", bytes).c_str()), cc::kSuccess);
+    reader.setSwapBytes(true);
+    EXPECT_TRUE(reader.readln(line));
+    EXPECT_TRUE(reader.rewind()); // keeps the order
+    EXPECT_TRUE(reader.readln(line));
+    EXPECT_EQ(line, "a");
+}
+
+TEST(tfreader_t, AnswersWithCodes)
+{
+    EXPECT_EQ(cc::kAlreadyOpen, 0x21636C73);
+    EXPECT_EQ(cc::kCannotOpen, 0x21666420);
+    EXPECT_EQ(cc::kUnknownFormat, 0x216C7574);
+
+    TemporaryFolder const folder;
+    std::string const path = folder.write("text", "a\nb\n");
+    cc::tfreader_t reader;
+    std::string line = "left over";
+    EXPECT_FALSE(reader.readln(line));
+    EXPECT_EQ(line, "");
+    EXPECT_FALSE(reader.rewind());
+    EXPECT_EQ(reader.open(nullptr), cc::kCannotOpen);
+    EXPECT_EQ(reader.open(folder.path("none").c_str()), cc::kCannotOpen);
+    EXPECT_EQ(reader.open(path.c_str()), cc::kSuccess);
+    EXPECT_EQ(reader.open(path.c_str()), cc::kAlreadyOpen);
+    EXPECT_EQ(reader.fileSize(), 4);
+    while (reader.readln(line)) {}
+    EXPECT_EQ(line, "");
+    EXPECT_TRUE(reader.rewind());
+    EXPECT_TRUE(reader.readln(line));
+    EXPECT_EQ(line, "a");
+    reader.close();
+    EXPECT_FALSE(reader.readln(line));
+    EXPECT_EQ(reader.open(folder.path("").c_str()),
+              cc::kSuccess); // a folder opens and has no lines
+    EXPECT_FALSE(reader.readln(line));
+}
+
+TEST(tfreader_t, APipeDoesNotRewind)
+{
+    int ends[2];
+    ASSERT_EQ(::pipe(ends), 0);
+    ASSERT_EQ(::write(ends[1], "a\nb\n", 4), 4);
+    cc::tfreader_t reader;
+    ASSERT_EQ(reader.open(("/proc/self/fd/" + std::to_string(ends[0])).c_str()), cc::kSuccess);
+    EXPECT_EQ(reader.fileSize(), -1);
+    std::string line;
+    EXPECT_TRUE(reader.readln(line));
+    EXPECT_FALSE(reader.rewind());
+    EXPECT_FALSE(reader.readln(line));
+    ::close(ends[0]);
+    ::close(ends[1]);
+}
+
+TEST(tfreader_t, TheLimitCutsLinesAndNotTheFile)
+{
+    TemporaryFolder const folder;
+    std::string const path =
+        folder.write("text", "abcdef\n" + std::string(9000, 'x') + "\nab\n\xEF\xBB\xBF\n");
+    cc::tfreader_t reader(cc::tfreader_t::kUTF8, 3);
+    ASSERT_EQ(reader.open(path.c_str()), cc::kSuccess);
+    Lines lines;
+    for (std::string line; reader.readln(line);)
+        lines.push_back(line);
+    EXPECT_EQ(lines, (Lines{"abc", "xxx", "ab", "\xEF\xBB\xBF"}));
+}
+
+} // namespace

@@ -1,0 +1,252 @@
+#include "Input.h"
+#include "Json.h"
+#include "ToolError.h"
+#include "commands.h"
+
+#include <korvane/numerics/KVMatrix44Double.h>
+
+#include <algorithm>
+#include <charconv>
+#include <cmath>
+#include <memory>
+#include <numbers>
+#include <span>
+
+namespace {
+
+using Matrix = KVMatrix44Tmpl<double>;
+
+/// The order of the angles: about z, then x, then y, as extendedDescription tells them.
+constexpr int rotationOrder = 4;
+
+/// Sixteen numbers, row by row: each an argument, or all of them in the one file that is named.
+class MatrixArgument {
+public:
+    void addTo(CLI::App& command, std::string const& description)
+    {
+        command.add_option("MATRIX", words_, description)->type_name("");
+    }
+    bool isGiven() const { return !words_.empty(); }
+
+    Matrix read() const
+    {
+        if (words_.size() == 1)
+            return readFrom(words_[0]);
+        Matrix matrix;
+        for (std::size_t i = 0; i < words_.size(); ++i)
+            if (std::string const fault = store(words_[i], i, matrix); !fault.empty())
+                throw ToolError(ExitCode::BadInput, fault);
+        if (std::string const fault = missing(words_.size()); !fault.empty())
+            throw ToolError(ExitCode::BadInput, fault);
+        return matrix;
+    }
+
+private:
+    /// Numbers stand apart by blanks, line ends, commas, semicolons or brackets, so that a matrix
+    /// that was printed can be read again.
+    static Matrix readFrom(std::string const& path)
+    {
+        constexpr char separators[] = " \t\r\n,;()[]";
+        std::string const text = readFile(path);
+        Matrix matrix;
+        std::size_t count = 0;
+        unsigned long line = 1;
+        std::size_t end = 0;
+        for (;;) {
+            std::size_t const start =
+                std::min(text.find_first_not_of(separators, end), text.size());
+            line += static_cast<unsigned long>(
+                std::count(text.data() + end, text.data() + start, '\n'));
+            if (start == text.size())
+                break;
+            end = std::min(text.find_first_of(separators, start), text.size());
+            if (std::string const fault =
+                    store(std::string_view(text).substr(start, end - start), count++, matrix);
+                !fault.empty())
+                throw badInput(path, line, fault);
+        }
+        if (std::string const fault = missing(count); !fault.empty())
+            throw badInput(path, line, fault);
+        return matrix;
+    }
+
+    /// Stores the number that has `index` others before it; else says what is wrong with it.
+    static std::string store(std::string_view word, std::size_t index, Matrix& matrix)
+    {
+        std::string const which = "number " + std::to_string(index + 1);
+        std::string const shown = " \"" + std::string(word.substr(0, 40)) + "\" ";
+        if (index > 15)
+            return which + shown + "is one too many: a matrix has sixteen";
+        std::string_view const digits = word.substr(word.starts_with('+') ? 1 : 0);
+        double value = 0;
+        auto const [end, error] =
+            std::from_chars(digits.data(), digits.data() + digits.size(), value);
+        if (error == std::errc::invalid_argument || end != digits.data() + digits.size())
+            return which + shown + "is not a number";
+        if (error != std::errc() || !std::isfinite(value))
+            return which + shown + "is out of range";
+        matrix.data()[index] = value;
+        return {};
+    }
+    static std::string missing(std::size_t count)
+    {
+        if (count >= 16)
+            return {};
+        return "number " + std::to_string(count + 1) +
+               " is missing: a matrix has sixteen, here are " + std::to_string(count);
+    }
+
+    std::vector<std::string> words_;
+};
+
+std::string shortest(double value)
+{
+    char text[32];
+    return {text, std::to_chars(text, text + sizeof text, value).ptr};
+}
+
+Json rowsOf(Matrix const& matrix)
+{
+    Json rows = Json::array();
+    for (int row = 0; row < 4; ++row)
+        rows.push_back({matrix(row, 0), matrix(row, 1), matrix(row, 2), matrix(row, 3)});
+    return rows;
+}
+
+/// Prints the matrix in a form that is read again.
+void printMatrix(Matrix matrix, bool json)
+{
+    for (double& value : std::span(matrix.data(), 16)) {
+        if (!std::isfinite(value))
+            throw ToolError(ExitCode::Failed, "the result is out of range");
+        value += 0.0; // -0 becomes 0
+    }
+    if (json) {
+        printJson({{"matrix", rowsOf(matrix)}});
+        return;
+    }
+    std::string text;
+    for (int i = 0; i < 16; ++i)
+        text += shortest(matrix.data()[i]) + (i % 4 == 3 ? "\n" : " ");
+    printOutput(text);
+}
+
+Json axes(KVVector3<double> const& v)
+{
+    return {{"x", v.x}, {"y", v.y}, {"z", v.z}};
+}
+
+void decompose(Matrix const& matrix, bool json)
+{
+    KVMatrix44Parameters<double> p;
+    p.rotOrder = rotationOrder;
+    if (!matrix.getTransformation(p))
+        throw ToolError(ExitCode::Failed, "a singular matrix cannot be taken apart");
+    if (!json) {
+        printOutput(KVMatrix44Double(matrix).extendedDescription().toUTF8() + "\n");
+        return;
+    }
+    printJson({{"translation", axes(p.translation)},
+               {"scale", axes(p.scale)},
+               {"rotationRadians", axes(p.rotation)},
+               {"shear", {{"x", p.shear.x}, {"y", p.shear.y}}},
+               {"matrix", rowsOf(matrix)}});
+}
+
+void invert(Matrix const& matrix, bool planar, bool json)
+{
+    Matrix inverse;
+    if (!(planar ? inverse.planarInverseZ(matrix) : inverse.invert(matrix)))
+        throw ToolError(ExitCode::Failed, "a singular matrix has no inverse");
+    printMatrix(inverse, json);
+}
+
+void addDecompose(CLI::App& family)
+{
+    struct Options {
+        MatrixArgument matrix;
+        bool json = false;
+    };
+    auto const options = std::make_shared<Options>();
+    auto& command = *family.add_subcommand(
+        "decompose", "Tell translation, scale, rotation and shear of a transform");
+    options->matrix.addTo(command, "The transform");
+    command.get_option("MATRIX")->required();
+    addJsonFlag(command, options->json);
+    command.callback([options] { decompose(options->matrix.read(), options->json); });
+}
+
+void addInvert(CLI::App& family)
+{
+    struct Options {
+        MatrixArgument matrix;
+        bool planar = false;
+        bool json = false;
+    };
+    auto const options = std::make_shared<Options>();
+    auto& command = *family.add_subcommand("invert", "Print the inverse of a transform");
+    options->matrix.addTo(command, "The transform");
+    command.get_option("MATRIX")->required();
+    command.add_flag("--planar", options->planar,
+                     "Invert in the plane z = 0; the result flattens z");
+    addJsonFlag(command, options->json);
+    command.callback([options] { invert(options->matrix.read(), options->planar, options->json); });
+}
+
+void addCompose(CLI::App& family)
+{
+    struct Options {
+        MatrixArgument matrix;
+        std::vector<double> translation{0, 0, 0}, scale{1, 1, 1}, rotation{0, 0, 0}, shear{0, 0};
+        bool json = false;
+    };
+    auto const options = std::make_shared<Options>();
+    auto& command = *family.add_subcommand(
+        "compose", "Print the transform that rotates, then shears and scales, then translates");
+    options->matrix.addTo(command, "A transform that acts before it; none if left out");
+    auto const add = [&command](char const* name, std::vector<double>& values,
+                                char const* description) {
+        command.add_option(name, values, description)
+            ->expected(static_cast<int>(values.size()))
+            ->allow_extra_args(false)
+            ->check(CLI::Number);
+    };
+    add("--translate", options->translation, "Along x, y and z");
+    add("--scale", options->scale, "Along x, y and z");
+    add("--rotate", options->rotation, "Degrees about x, y and z, applied about z, x, y");
+    add("--shear", options->shear, "How much of x and of y column z gains");
+    addJsonFlag(command, options->json);
+    command.callback([options] {
+        auto const vector = [](std::vector<double> const& v) {
+            return KVVector3<double>(v[0], v[1], v[2]);
+        };
+        KVMatrix44Parameters<double> p;
+        p.rotOrder = rotationOrder;
+        p.translation = vector(options->translation);
+        p.scale = vector(options->scale);
+        p.rotation = vector(options->rotation) * (std::numbers::pi / 180);
+        p.shear = {options->shear[0], options->shear[1]};
+        Matrix matrix;
+        matrix.setTransformation(p);
+        if (options->matrix.isGiven())
+            matrix.rightMult(options->matrix.read());
+        printMatrix(matrix, options->json);
+    });
+}
+
+} // namespace
+
+void addMatrixCommands(CLI::App& program)
+{
+    auto& family = *program.add_subcommand("matrix", "Take 4x4 transforms apart, invert them and "
+                                                     "put them together");
+    family.require_subcommand(1);
+    family.footer(
+        "MATRIX is sixteen numbers, row by row, each an argument, or one FILE of them.\n"
+        "The transform acts on columns: numbers 4, 8 and 12 are the translation. Rotations\n"
+        "are applied about z, then x, then y; compose takes degrees, decompose --json\n"
+        "gives radians.");
+    addDecompose(family);
+    addInvert(family);
+    addCompose(family);
+}
