@@ -11,10 +11,15 @@ constexpr unsigned kElement = 5;
 KVScope scope[] = {{"element", kElement, 0}, {"a", kElement, 1}, {"b", kElement, 2}, {"a", 6, 3},
                    {"b", kElement, 4},       {nullptr, 0, 0}};
 
-std::unique_ptr<KVXMLStreamElement> elementWith(std::string content)
+void append(KVXMLStreamElement& element, std::string text, bool newline)
+{
+    element.appendContentWithNewline(text.data(), newline);
+}
+
+std::unique_ptr<KVXMLStreamElement> elementWith(std::string const& content)
 {
     auto element = std::make_unique<KVXMLStreamElement>(kElement, scope, nullptr);
-    element->appendContentWithNewline(content.data(), true);
+    append(*element, content, true);
     return element;
 }
 
@@ -138,7 +143,7 @@ TEST(KVXMLStreamElement, GivesFalseWithoutText)
     for (bool const empty : {false, true}) {
         KVXMLStreamElement element(kElement, scope, nullptr);
         if (empty)
-            element.appendContentWithNewline("", 0, false);
+            append(element, "", false);
         int integer = 99;
         double real = 99;
         bool boolean = true;
@@ -185,7 +190,7 @@ TEST(KVXMLStreamElement, ReadsListsByItsCursor)
     element->getAsString(&whole);
     EXPECT_EQ(whole.toUTF8().front(), ' ') << "a string does not mind the cursor";
     // More text takes the cursor back to the start.
-    element->appendContentWithNewline("8", 1, true);
+    append(*element, "8", true);
     EXPECT_TRUE(element->getAsInt32(&integer));
     EXPECT_EQ(integer, 1);
 }
