@@ -22,12 +22,6 @@ void addTimeCommands(CLI::App& program);
 
 /// The families, in the order in which `korvane --help` lists them.
 inline constexpr AddCommands commandFamilies[] = {
-    addSceneCommands,
-    addTimeCommands,
-    addRangesCommands,
-    addCaptionsCommands,
-    addMatrixCommands,
-    addLutCommands,
-    addBlendCommands,
-    addMediaCommands,
+    addSceneCommands,  addTimeCommands, addRangesCommands, addCaptionsCommands,
+    addMatrixCommands, addLutCommands,  addBlendCommands,  addMediaCommands,
 };
