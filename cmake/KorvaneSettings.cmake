@@ -31,6 +31,8 @@ endif()
 # The results of floating-point code are part of the interface: no fused
 # multiply-add may be formed behind the source's back.
 add_compile_options(-ffp-contract=off)
+# The library's calls of its own exported functions are bound as it is built, so they may be inlined.
+add_compile_options(-fno-semantic-interposition)
 add_compile_options(-Wall -Wextra -Wpedantic -Wshadow -Wnon-virtual-dtor
                     -Woverloaded-virtual -Wcast-qual -Wformat=2)
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU" AND CMAKE_CXX_COMPILER_VERSION VERSION_LESS 13)

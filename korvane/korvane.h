@@ -111,3 +111,20 @@
 #include <korvane/numerics/KVVector2.h>
 #include <korvane/numerics/KVVector3.h>
 #include <korvane/numerics/KVVector4.h>
+#include <korvane/captions/KVCaption.h>
+#include <korvane/captions/KVCaptionCEA608.h>
+#include <korvane/captions/KVCaptionSRT.h>
+#include <korvane/captions/KVCaptionText.h>
+#include <korvane/captions/KVCaptioniTT.h>
+#include <korvane/captions/KVMutableCaption.h>
+#include <korvane/captions/KVSRTCaptionsExporter.h>
+#include <korvane/captions/KVSRTCaptionsImporter.h>
+#include <korvane/media/KVAtomBox.h>
+#include <korvane/media/KVAtomBoxFile.h>
+#include <korvane/media/KVAtomMetadataHandler.h>
+#include <korvane/media/KVImageDescAtomBox.h>
+#include <korvane/media/KVXMPStringParser.h>
+
+#include <korvane/compositing/KVBlend.h>
+#include <korvane/compositing/KVFxBlendOptions.h>
+#include <korvane/compositing/KVFxLightWrapOptions.h>

@@ -50,6 +50,14 @@ bool KVCaptionCEA608::isEqual(NSObject const* other) const
            caption->scrollBehavior_ == scrollBehavior_;
 }
 
+std::size_t KVCaptionCEA608::hash() const
+{
+    std::size_t hash = KVCaption::hash();
+    for (long long field : {cellX_, cellY_, height_, animationBehavior_, scrollBehavior_})
+        hash = hash * 31 + static_cast<std::size_t>(field);
+    return hash;
+}
+
 KVCaption* KVCaptionCEA608::newCopy() const
 {
     return new KVCaptionCEA608(*this);

@@ -33,6 +33,7 @@ public:
     long long midCellX() const noexcept;
 
     bool isEqual(NSObject const* other) const override;
+    std::size_t hash() const override;
 
     KVCaption* newCopy() const override;
     KVCaption* newMutableCopy() const override;

@@ -81,6 +81,14 @@ bool KVCaptioniTT::isEqual(NSObject const* other) const
                       [](auto const& a, auto const& b) { return CFEqual(a.get(), b.get()); });
 }
 
+std::size_t KVCaptioniTT::hash() const
+{
+    std::size_t hash = KVCaption::hash() * 31 + CFHash(regionString_.cf_str());
+    for (auto const& entry : rubyText_)
+        hash = hash * 31 + CFHash(entry);
+    return hash;
+}
+
 KVCaption* KVCaptioniTT::newCopy() const
 {
     return new KVCaptioniTT(*this);

@@ -4,8 +4,8 @@
 
 class KVMutableCaptioniTT;
 
-/// A timed-text caption (iTunes Timed Text, a profile of TTML): text on black in a named region,
-/// with ruby, small text beside the main one.
+/// A caption of timed text (iTT, a profile of W3C TTML): text on black in a named region, with
+/// ruby, small text beside the main one.
 ///
 ///     auto caption = KVMakeRef<KVMutableCaptioniTT>(text, range, "bottom");
 ///     caption->setRubyText("かんじ", {0, 2});
@@ -36,6 +36,7 @@ public:
     static RubyText nullArrayWithCapacity(std::size_t count);
 
     bool isEqual(NSObject const* other) const override;
+    std::size_t hash() const override;
 
     KVCaption* newCopy() const override;
     KVCaption* newMutableCopy() const override;

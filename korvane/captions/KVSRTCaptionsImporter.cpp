@@ -10,6 +10,8 @@
 #include <korvane/time/KVTime.h>
 #include <korvane/time/KVTimeRange.h>
 
+#include <algorithm>
+#include <array>
 #include <iterator>
 #include <unordered_map>
 
@@ -152,12 +154,12 @@ void KVSRTCaptionsImporter::takeFontColor(std::u16string_view token)
 
 KVSRTCaptionsImporter::Tag KVSRTCaptionsImporter::_tagFromToken(KVString const& token)
 {
-    KVSubRip::Tag const tag =
+    Tag const tag =
         KVSubRip::tagFromToken(token.view(), KVSubRip::CharacterSet(tagBeginningCharacters_.view()),
                                KVSubRip::CharacterSet(tagEndingCharacters_.view()));
-    if (tag == KVSubRip::font)
+    if (tag == font)
         takeFontColor(token.view());
-    return static_cast<Tag>(tag);
+    return tag;
 }
 
 KVNSRef<NSAttributedString*>
@@ -323,7 +325,8 @@ KVNSRef<NSError*> KVSRTCaptionsImporter::_parseTimecodeString(KVString const& te
     std::optional<double> const value = KVSubRip::parseTimecode(text.view());
     if (!value)
         return makeError(badTimecode);
-    *seconds = *value;
+    if (seconds)
+        *seconds = *value;
     return nullptr;
 }
 
@@ -343,11 +346,15 @@ KVSRTCaptionsImporter::importCaptionsFromString(KVString const& text,
 {
     if (!text.view().starts_with(u'1'))
         return makeError(badFile);
-    if (!CMTimeIsNumeric(frameDuration) || frameDuration.timescale < 1)
-        frameDuration = kCMTimeInvalid;
+    if (!CMTimeIsNumeric(frameDuration))
+        frameDuration = kCMTimeInvalid; // which no time can be made with
 
-    std::u16string const lines = withPlainLineEnds(text.view());
-    std::u16string_view const all = lines;
+    std::u16string_view all = text.view();
+    std::u16string plain;
+    if (all.find(u"\r\n") != all.npos) {
+        plain = withPlainLineEnds(all);
+        all = plain;
+    }
     LineReader reader(all);
     for (double expectedNumber = 1;; ++expectedNumber) {
         std::u16string_view line;

@@ -15,9 +15,9 @@
 ///     <i>Who is there?</i>
 ///
 ///     std::vector<KVCaptionArray> captions;
+///     CMTime const frame = CMTimeMake(1001, 24000);
 ///     auto importer = KVMakeRef<KVSRTCaptionsImporter>();
-///     auto error = importer->importCaptionsFromURL(url, captions, CMTimeMake(1001, 24000),
-///     kCMTimeZero); if (!error)
+///     if (!importer->importCaptionsFromURL(url, captions, frame, kCMTimeZero))
 ///         captions[0][0]->text();   // "Who is there?"
 ///
 /// Numbers must be 1, 2, 3 and so on; tags are <b>, <i>, <u>, <br> and <font color="..."> in angle

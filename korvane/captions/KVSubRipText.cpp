@@ -121,26 +121,27 @@ Tag tagFromToken(std::u16string_view token, CharacterSet const& starts,
                  CharacterSet const& ends) noexcept
 {
     if (token.size() < 3 || !starts.contains(token.front()) || !ends.contains(token.back()))
-        return notATag;
+        return Tag::notATag;
     std::u16string_view const inner = token.substr(1, token.size() - 2);
     struct Short {
         std::u16string_view name;
         Tag tag;
     };
     static constexpr Short shorts[] = {
-        {u"b", boldOn},     {u"i", italicOn},      {u"u", underlineOn}, {u"/b", boldOff},
-        {u"/i", italicOff}, {u"/u", underlineOff}, {u"br", lineBreak},
+        {u"b", Tag::boldOn},     {u"i", Tag::italicOn},   {u"u", Tag::underlineOn},
+        {u"/b", Tag::boldOff},   {u"/i", Tag::italicOff}, {u"/u", Tag::underlineOff},
+        {u"br", Tag::lineBreak},
     };
     if (inner.size() <= 2) {
         for (Short const& candidate : shorts) {
             if (equalsIgnoringCase(inner, candidate.name))
                 return candidate.tag;
         }
-        return notATag;
+        return Tag::notATag;
     }
     if (equalsIgnoringCase(inner, u"br/"))
-        return lineBreak;
-    return firstWord(inner) == u"font" ? font : unknownTag;
+        return Tag::lineBreak;
+    return firstWord(inner) == u"font" ? Tag::font : Tag::unknownTag;
 }
 
 std::optional<std::u16string_view> colorText(std::u16string_view inner) noexcept

@@ -1,12 +1,14 @@
 #pragma once
 
+#include <korvane/captions/KVSRTCaptionsImporter.h>
+
 #include <array>
 #include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
 
-/// The small grammar of SubRip text, on views of UTF-16. Nothing here allocates or knows captions.
+/// The small grammar of SubRip text, on views of UTF-16; it knows nothing of captions.
 namespace KVSubRip {
 
 /// A few characters, asked for often.
@@ -61,20 +63,8 @@ void tokenize(std::u16string_view text, CharacterSet const& starts, CharacterSet
         emit(text.substr(tokenStart));
 }
 
-/// What a token is; the numbers are those that KVSRTCaptionsImporter answers.
-enum Tag : int {
-    notATag = 0,
-    unknownTag,
-    lineBreak,
-    boldOn,
-    boldOff,
-    italicOn,
-    italicOff,
-    underlineOn,
-    underlineOff,
-    font,
-    fontOff,
-};
+/// What a token is.
+using Tag = KVSRTCaptionsImporter::Tag;
 Tag tagFromToken(std::u16string_view token, CharacterSet const& starts,
                  CharacterSet const& ends) noexcept;
 

@@ -13,7 +13,6 @@ namespace cc {
 
 namespace {
 
-constexpr std::size_t longestLine = std::size_t(1) << 20;
 constexpr std::size_t longestName = 255;
 constexpr int longestEdge = 256;
 
@@ -95,7 +94,7 @@ bool lut_t::isCube() const noexcept
 int lut_t::read(char const* path, unsigned long index)
 {
     reset();
-    tfreader_t reader(tfreader_t::kUTF8, longestLine);
+    tfreader_t reader(tfreader_t::kUTF8, kLongestLine);
     if (int const code = reader.open(path))
         return code;
     format_ = detectFormat(reader);

@@ -8,6 +8,8 @@
 
 namespace cc {
 
+class multilut_t;
+
 /// A colour in floats: red, green, blue.
 using rgb_t = std::array<float, 3>;
 
@@ -93,11 +95,15 @@ public:
     void process(processor_t const& processor);
 
 private:
+    friend class multilut_t;
+
     void reset();
     unsigned int detectFormat(tfreader_t& reader);
     /// The title in one line, or the file's name where there is none.
     std::string titleFor(char const* fileName) const;
     bool isCube() const noexcept;
+
+    static constexpr std::size_t kLongestLine = std::size_t(1) << 20;
 
     unsigned int format_ = 0;
 };

@@ -56,6 +56,7 @@ struct EulerOrder {
 
 constexpr EulerOrder orders[] = {
     // clang-format off
+    // axes    middle    first                last                 locked               applied
     {1, 0, 2, {2,0,-1}, {{2,1},    {2,2}}, {{1,0},    {0,0}}, {{1,2,-1}, {1,1}}, {0,1,2}},
     {2, 0, 1, {1,0},    {{1,2,-1}, {1,1}}, {{2,0,-1}, {0,0}}, {{2,1},    {2,2}}, {0,2,1}},
     {0, 1, 2, {2,1},    {{2,0,-1}, {2,2}}, {{0,1,-1}, {1,1}}, {{0,2},    {0,0}}, {1,0,2}},
@@ -88,9 +89,14 @@ bool KVMatrix44Tmpl<T>::getPartialTransformation(KVMatrix44Parameters<T>& parame
     Vector row0(m[0] / w, m[1] / w, m[2] / w);
     Vector row1(m[4] / w, m[5] / w, m[6] / w);
     Vector row2(m[8] / w, m[9] / w, m[10] / w);
-    if (row2.dot(row0.cross(row1)) == 0)
+    Vector const translation(m[3] / w, m[7] / w, m[11] / w);
+    KVMatrix44Tmpl const affine({row0.x, row0.y, row0.z, translation.x, //
+                                 row1.x, row1.y, row1.z, translation.y, //
+                                 row2.x, row2.y, row2.z, translation.z, //
+                                 0, 0, 0, 1});
+    if (affine.determinant() == 0)
         return false;
-    parameters.translation = {m[3] / w, m[7] / w, m[11] / w};
+    parameters.translation = translation;
 
     Vector& scale = parameters.scale;
     auto const normalize = [](Vector& row, T& length) {

@@ -6,14 +6,6 @@
 #include <numbers>
 #include <utility>
 
-#if defined(__x86_64__) && !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
-// One more form of a function for machines that have AVX, chosen when the library is loaded. It
-// rounds as the other does: none of them may fuse a product and a sum.
-#define KV_WIDE_CLONES __attribute__((target_clones("avx", "default")))
-#else
-#define KV_WIDE_CLONES
-#endif
-
 namespace {
 
 constexpr double tolerance = 1e-7;
@@ -47,8 +39,20 @@ template <class T>
         rowsOf(product)[i] = a[0] * b0 + a[1] * b1 + a[2] * b2 + a[3] * b3;
 }
 
-KV_WIDE_CLONES void multiply(double const* a, double const* b, double* product) noexcept
+#if defined(__x86_64__)
+/// On machines with AVX, which rounds as the other form does: none may fuse a product and a sum.
+[[gnu::target("avx")]] void multiplyAVX(double const* a, double const* b, double* product) noexcept
 {
+    multiplyRows(a, b, product);
+}
+#endif
+
+inline void multiply(double const* a, double const* b, double* product) noexcept
+{
+#if defined(__x86_64__)
+    if (__builtin_cpu_supports("avx"))
+        return multiplyAVX(a, b, product);
+#endif
     multiplyRows(a, b, product);
 }
 

@@ -56,8 +56,9 @@ private:
 /// A caption as a player takes it: styled text over a time range, a region, ruby over ranges of the
 /// text and an animation.
 ///
-///     auto caption = KVMakeRef<AVCaption>("Hello", CMTimeRangeMake(kCMTimeZero, CMTimeMake(2,
-///     1))); caption->setRegion(AVCaptionRegion::subRipTextBottomRegion());
+///     CMTimeRange const range = {kCMTimeZero, CMTimeMake(2, 1)};
+///     auto caption = KVMakeRef<AVCaption>("Hello", range);
+///     caption->setRegion(AVCaptionRegion::subRipTextBottomRegion());
 ///
 /// A portable model that can be changed; not synchronised.
 class KV_EXPORT AVCaption final : public NSObject {

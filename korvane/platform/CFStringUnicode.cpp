@@ -165,7 +165,9 @@ std::size_t CFStringGetGraphemeBoundary(std::u16string_view units, std::size_t s
 
 bool CFCharacterIsWhitespace(char16_t unit) noexcept
 {
-    return unit == u'\t' || u_charType(unit) == U_SPACE_SEPARATOR;
+    if (unit < 0x80)
+        return unit == u' ' || unit == u'\t';
+    return u_charType(unit) == U_SPACE_SEPARATOR;
 }
 
 bool CFCharacterIsNewline(char16_t unit) noexcept

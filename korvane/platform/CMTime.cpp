@@ -70,20 +70,38 @@ struct Ticks {
     bool fits(bool negative) const noexcept { return count <= kv::greatestMagnitude(negative); }
 };
 
+template <class Integer>
+bool isRoundedUp(Integer left, Integer denominator, CMTimeRoundingMethod method) noexcept
+{
+    switch (method) {
+    case kCMTimeRoundingMethod_RoundAwayFromZero:
+        return left != 0;
+    case kCMTimeRoundingMethod_RoundTowardZero:
+        return false;
+    default:
+        return left >= denominator - left;
+    }
+}
+
 Ticks ticksOf(Fraction const& seconds, std::uint32_t timescale,
               CMTimeRoundingMethod method) noexcept
 {
+    // Mostly all of it fits 64 bits, which divide much faster.
+    std::uint64_t product;
+    if (seconds.numerator <= UINT64_MAX && seconds.denominator <= UINT64_MAX &&
+        !__builtin_mul_overflow(static_cast<std::uint64_t>(seconds.numerator), timescale,
+                                &product)) {
+        auto const denominator = static_cast<std::uint64_t>(seconds.denominator);
+        std::uint64_t const ticks = product / denominator, left = product % denominator;
+        return {uint128{ticks} + isRoundedUp(left, denominator, method), left == 0};
+    }
     uint128 const whole = seconds.numerator / seconds.denominator;
     if (whole >> 64)
         return {~uint128{0}, false};
     uint128 const rest = (seconds.numerator - whole * seconds.denominator) * timescale;
     uint128 const ticks = rest / seconds.denominator;
     uint128 const left = rest - ticks * seconds.denominator;
-    bool const up = method == kCMTimeRoundingMethod_RoundAwayFromZero ? left != 0
-                    : method == kCMTimeRoundingMethod_RoundTowardZero
-                        ? false
-                        : 2 * left >= seconds.denominator;
-    return {whole * timescale + ticks + (up ? 1 : 0), left == 0};
+    return {whole * timescale + ticks + isRoundedUp(left, seconds.denominator, method), left == 0};
 }
 
 CMTime make(bool negative, uint128 count, std::uint32_t timescale, std::uint32_t flags,

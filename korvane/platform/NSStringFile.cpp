@@ -139,11 +139,14 @@ KVNSRef<NSError*> systemError(int code)
 /// A file descriptor that closes itself.
 class File {
 public:
-    /// On failure `error()` tells why. A path with a zero in it names no file.
+    /// On failure `error()` tells why. A URL of another scheme, and a path with a zero in it, name
+    /// no file.
     File(KVURL const& url, int flags)
     {
+        std::string const text = url.getAbsoluteString();
+        bool const isElsewhere = text.find("://") != text.npos && !text.starts_with("file://");
         std::string const path = CFURLGetFileSystemPath(url.cf_url());
-        if (path.empty() || path.find('\0') != path.npos)
+        if (isElsewhere || path.empty() || path.find('\0') != path.npos)
             error_ = ENOENT;
         else if ((descriptor_ = ::open(path.c_str(), flags | O_CLOEXEC, 0666)) < 0)
             error_ = errno;

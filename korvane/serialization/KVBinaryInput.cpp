@@ -5,7 +5,7 @@
 void KVBinaryInput::attach()
 {
     if (!window_)
-        window_ = std::make_unique_for_overwrite<unsigned char[]>(windowSize);
+        window_ = std::make_unique_for_overwrite<unsigned char[]>(windowSize + slack);
     cursor_ = window_.get();
     end_ = cursor_;
     start_ = stream_.getPos();

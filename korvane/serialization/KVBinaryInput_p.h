@@ -11,6 +11,8 @@ class KVBinaryInput {
 public:
     /// The most bytes that `take` gives at once.
     static constexpr std::size_t windowSize = 65536;
+    /// So many bytes behind those that `take` gives may be read as well; they mean nothing.
+    static constexpr std::size_t slack = 8;
 
     explicit KVBinaryInput(KVStream& stream) noexcept : stream_(stream) {}
 

@@ -2,6 +2,7 @@
 
 #include <korvane/platform/CMTime.h>
 
+#include <bit>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
@@ -71,21 +72,24 @@ constexpr unsigned int byteLength(std::uint64_t value) noexcept
     return (64 - static_cast<unsigned int>(__builtin_clzll(value | 1)) + 7) / 8;
 }
 
+/// Whatever the length, 8 bytes must be readable.
 inline std::uint64_t loadLittleEndian(unsigned char const* bytes, unsigned int length) noexcept
 {
-    std::uint64_t value = 0;
-    for (unsigned int i = 0; i < length; ++i)
-        value |= static_cast<std::uint64_t>(bytes[i]) << 8 * i;
-    return value;
+    std::uint64_t value;
+    std::memcpy(&value, bytes, sizeof value);
+    if constexpr (std::endian::native == std::endian::big)
+        value = __builtin_bswap64(value);
+    return length == 8 ? value : value & ((std::uint64_t{1} << 8 * length) - 1);
 }
 
-/// Writes `length` bytes and returns the place behind them.
+/// Writes `length` bytes and returns the place behind them. There must be room for 8.
 inline unsigned char* storeLittleEndian(unsigned char* out, std::uint64_t value,
                                         unsigned int length) noexcept
 {
-    for (unsigned int i = 0; i < length; ++i)
-        *out++ = static_cast<unsigned char>(value >> 8 * i);
-    return out;
+    if constexpr (std::endian::native == std::endian::big)
+        value = __builtin_bswap64(value);
+    std::memcpy(out, &value, sizeof value);
+    return out + length;
 }
 
 } // namespace kv::binary

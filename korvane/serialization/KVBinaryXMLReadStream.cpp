@@ -256,6 +256,7 @@ KVBinaryXMLReadStream::Start KVBinaryXMLReadStream::startElement()
     unsigned int count;
     if (!takeVarInt(*input_, &count))
         return Start::failed;
+    element->expectAttributes(count);
     for (; count > 0; --count) {
         unsigned int attribute;
         if (!takeVarInt(*input_, &attribute))

@@ -1,11 +1,18 @@
 #include <korvane/serialization/KVBinaryXMLStreamElement.h>
 
+#include <algorithm>
+
 KVBinaryXMLStreamElement::KVBinaryXMLStreamElement(unsigned int elementToken, KVScope* inScope,
                                                    KVSerializer* elementHandler)
     : KVStreamElement(elementToken, inScope, elementHandler)
 {}
 
 KVBinaryXMLStreamElement::~KVBinaryXMLStreamElement() = default;
+
+void KVBinaryXMLStreamElement::expectAttributes(unsigned int count)
+{
+    attributes_.reserve(std::min(count, 16u));
+}
 
 KVBinaryXMLField const* KVBinaryXMLStreamElement::find(unsigned int attribute) const noexcept
 {

@@ -19,6 +19,8 @@ public:
 
     // --- For the reader ---
 
+    /// Makes room for so many attributes, or for some of them if they are many.
+    void expectAttributes(unsigned int count);
     /// The last value of a token counts.
     void addAttribute(unsigned int attribute, unsigned long long value) { add(attribute, value); }
     void addAttribute(unsigned int attribute, unsigned long value) { add(attribute, value); }

@@ -10,7 +10,6 @@
 #include <cstring>
 #include <memory>
 #include <new>
-#include <optional>
 
 using namespace kv::binary;
 
@@ -18,6 +17,11 @@ namespace {
 
 /// Room for the encoded form of any value but a string, with an attribute's token in front of it.
 constexpr std::size_t encodedSize = 64;
+/// Room for an element's head: the marker of a child, token, size and number of attributes.
+constexpr std::size_t headSize = 16;
+constexpr std::size_t initialCapacity = 4096;
+/// An element of more bytes goes out before it ends.
+constexpr std::size_t heldSize = 2048;
 
 unsigned char* putVarInt(unsigned char* out, std::uint32_t value) noexcept
 {
@@ -137,42 +141,40 @@ void write(KVStream& stream, T const& value)
     stream.write(bytes, static_cast<unsigned long long>(end - bytes));
 }
 
-/// Writes the attribute's token, if there is one, and the tag, length and UTF-8 form of the text,
-/// all in one piece. Without memory for it the length and the text are left out.
-void writeString(KVStream& stream, std::optional<unsigned int> attribute, KVString const& text)
+std::size_t stringSize(KVString const& text) noexcept
 {
-    unsigned char head[encodedSize];
-    unsigned char* headEnd = attribute ? putVarInt(head, *attribute) : head;
-    *headEnd++ = stringTag;
+    return 6 + CFStringGetMaximumUTF8Length(text.size());
+}
 
-    constexpr std::size_t headRoom = 16;
-    unsigned char local[1024];
-    std::unique_ptr<unsigned char[]> allocated;
-    unsigned char* bytes = local;
-    std::size_t const needed = headRoom + CFStringGetMaximumUTF8Length(text.size());
-    if (needed > sizeof local) {
-        allocated.reset(new (std::nothrow) unsigned char[needed]);
-        bytes = allocated.get();
+/// Needs `stringSize` bytes.
+unsigned char* put(unsigned char* out, KVString const& text) noexcept
+{
+    *out++ = stringTag;
+    CFStringRef const string = text.cf_str();
+    if (string->isASCII()) {
+        out = putVarInt(out, text.size());
+        char16_t const* const units = string->units();
+        for (std::size_t i = 0, length = text.size(); i < length; ++i)
+            out[i] = static_cast<unsigned char>(units[i]);
+        return out + text.size();
     }
-    if (!bytes) {
-        stream.write(head, static_cast<unsigned long long>(headEnd - head));
-        return;
-    }
-    std::size_t const length =
-        CFStringEncodeUTF8(text.view(), reinterpret_cast<char*>(bytes + headRoom));
-    headEnd = putVarInt(headEnd, static_cast<std::uint32_t>(length));
-    auto const headLength = static_cast<std::size_t>(headEnd - head);
-    unsigned char* const start = bytes + headRoom - headLength;
-    std::memcpy(start, head, headLength);
-    stream.write(start, headLength + length);
+    constexpr std::size_t mostOfVarInt = 5;
+    auto* const utf8 = out + mostOfVarInt;
+    std::size_t const length = CFStringEncodeUTF8(text.view(), reinterpret_cast<char*>(utf8));
+    out = putVarInt(out, static_cast<std::uint32_t>(length));
+    std::memmove(out, utf8, length);
+    return out + length;
 }
 
 } // namespace
 
 KVBinaryXMLWriteStream::KVBinaryXMLWriteStream(KVStream& stream, unsigned int major,
                                                unsigned int minor)
-    : stream_(stream), attributeBuffer_(4096, 1024)
+    : stream_(stream)
 {
+    if (!reserve(initialCapacity))
+        throw std::bad_alloc();
+    held_ = headSize;
     // "%d.%d" of the two numbers, and the terminator.
     char header[sizeof magic + 2 * kvNumberTextSize];
     std::memcpy(header, magic, sizeof magic - 1);
@@ -187,70 +189,123 @@ KVBinaryXMLWriteStream::KVBinaryXMLWriteStream(KVStream& stream, unsigned int ma
 
 KVBinaryXMLWriteStream::~KVBinaryXMLWriteStream() = default;
 
+// --- The element that is held ---
+
+/// Room for that many bytes behind what is held; false when there is no memory.
+bool KVBinaryXMLWriteStream::reserve(std::size_t size) noexcept
+{
+    if (capacity_ - held_ >= size)
+        return true;
+    std::size_t const capacity = held_ + size + capacity_ / 2;
+    std::unique_ptr<unsigned char[]> grown(new (std::nothrow) unsigned char[capacity]);
+    if (!grown)
+        return false;
+    if (buffer_)
+        std::memcpy(grown.get(), buffer_.get(), held_);
+    buffer_ = std::move(grown);
+    capacity_ = capacity;
+    return true;
+}
+
+/// Where the next value of a fixed size, and an attribute's token in front of it, may be put.
+unsigned char* KVBinaryXMLWriteStream::roomForValue()
+{
+    if (!reserve(encodedSize))
+        throw std::bad_alloc();
+    return buffer_.get() + held_;
+}
+
+/// A value or a child follows: the number of attributes is final.
+void KVBinaryXMLWriteStream::endAttributes() noexcept
+{
+    // What is there without having been counted is an empty string. Alone, it has always been left
+    // out.
+    if (!attributesEnded_ && attributeCount_ == 0)
+        held_ = headSize;
+    attributesEnded_ = true;
+}
+
+/// Sends what is held of the element, with its size if that is known. Returns where its size
+/// stands.
+unsigned long long KVBinaryXMLWriteStream::send(bool whole)
+{
+    endAttributes();
+    unsigned char head[headSize + 8];
+    unsigned char* end = head;
+    if (elements_.size() > 1)
+        *end++ = childTag;
+    end = putVarInt(end, elements_.back().token);
+    unsigned char* const size = end;
+    end = putVarInt(end + sizeFieldLength, attributeCount_);
+    auto const headLength = static_cast<std::size_t>(end - head);
+    auto const sizeOffset = static_cast<std::size_t>(size - head);
+    std::size_t const inside = headLength - sizeOffset - sizeFieldLength + held_ - headSize;
+    unsigned char sizeBytes[8];
+    storeLittleEndian(sizeBytes, whole ? inside : 0, sizeFieldLength);
+    std::memcpy(size, sizeBytes, sizeFieldLength);
+
+    unsigned char* const start = buffer_.get() + headSize - headLength;
+    std::memcpy(start, head, headLength);
+    unsigned long long const position = whole ? 0 : stream_.getPos() + sizeOffset;
+    stream_.write(start, headLength + held_ - headSize);
+    held_ = headSize;
+    sent_ = true;
+    return position;
+}
+
+void KVBinaryXMLWriteStream::flushAttributes()
+{
+    if (!sent_)
+        elements_.back().sizePosition = send(false);
+}
+
 // --- Elements ---
 
 void KVBinaryXMLWriteStream::startElement(unsigned int token)
 {
     KVScope* const scope = topScope();
-    bool const nested = !elements_.empty();
-    if (nested)
-        flushAttributes();
+    flushAttributes();
     if (!scope)
         throwScopeUndefined();
     KVScope const* const row = findElement(scope, token);
     if (!row)
         throwTokenUndefined(scope);
-    attributeBuffer_.reset();
+    elements_.push_back({row->name, token, true, 0});
+    held_ = headSize;
     attributeCount_ = 0;
-    attributesFlushed_ = false;
-
-    unsigned char bytes[encodedSize];
-    unsigned char* end = bytes;
-    if (nested)
-        *end++ = childTag;
-    end = putVarInt(end, token);
-    auto const sizeOffset = static_cast<unsigned long long>(end - bytes);
-    end = storeLittleEndian(end, 0, sizeFieldLength);
-    unsigned long long const sizePosition = stream_.getPos() + sizeOffset;
-    stream_.write(bytes, sizeOffset + sizeFieldLength);
-    elements_.push_back({row->name, token, true, sizePosition});
+    attributesEnded_ = false;
+    sent_ = false;
 }
 
 void KVBinaryXMLWriteStream::endElement()
 {
     if (elements_.empty())
         throwNothingToEnd();
-    flushAttributes();
-    unsigned long long const sizePosition = elements_.back().sizePosition;
-    unsigned long long const end = stream_.getPos();
-    unsigned long long const size = end - sizePosition - sizeFieldLength;
-    if (size > 0xFFFFFFFFu && !cutSizeLogged_) {
-        cutSizeLogged_ = true;
-        _KVLogMessage(__FILE__, __LINE__,
-                      "The element %s has %llu bytes; its size is cut to 32 bits.",
-                      elements_.back().name, size);
-    }
-    unsigned char bytes[sizeFieldLength];
-    storeLittleEndian(bytes, size, sizeFieldLength);
-    stream_.setPos(sizePosition);
-    stream_.write(bytes, sizeFieldLength);
-    stream_.setPos(end);
+    if (sent_)
+        writeSize(elements_.back());
+    else
+        send(true);
     elements_.pop_back();
 }
 
-void KVBinaryXMLWriteStream::close() {}
-
-void KVBinaryXMLWriteStream::flushAttributes()
+void KVBinaryXMLWriteStream::writeSize(KVBinaryXMLElementInfo const& element)
 {
-    if (attributesFlushed_)
-        return;
-    writeVarInt(stream_, attributeCount_);
-    if (attributeCount_ != 0)
-        stream_.write(attributeBuffer_.getBuffer(), attributeBuffer_.getBufferSize());
-    attributeBuffer_.reset();
-    attributeCount_ = 0;
-    attributesFlushed_ = true;
+    unsigned long long const end = stream_.getPos();
+    unsigned long long const size = end - element.sizePosition - sizeFieldLength;
+    if (size > 0xFFFFFFFFu && !cutSizeLogged_) {
+        cutSizeLogged_ = true;
+        _KVLogMessage(__FILE__, __LINE__,
+                      "The element %s has %llu bytes; its size is cut to 32 bits.", element.name,
+                      size);
+    }
+    unsigned char bytes[8];
+    storeLittleEndian(bytes, size, sizeFieldLength);
+    stream_.setPos(element.sizePosition);
+    stream_.write(bytes, sizeFieldLength);
+    stream_.setPos(end);
 }
+
+void KVBinaryXMLWriteStream::close() {}
 
 unsigned int KVBinaryXMLWriteStream::openElementToken() const
 {
@@ -265,17 +320,38 @@ template <class T>
 void KVBinaryXMLWriteStream::writeTagged(T const& value)
 {
     static_cast<void>(openElementToken());
-    flushAttributes();
-    write(stream_, value);
+    if (sent_)
+        return write(stream_, value);
+    endAttributes();
+    held_ = static_cast<std::size_t>(put(roomForValue(), value) - buffer_.get());
+    if (held_ > heldSize)
+        flushAttributes();
+}
+
+/// The open element has an attribute of that token in the top scope, or this throws. An attribute
+/// is mostly the one in the row behind the last one's.
+void KVBinaryXMLWriteStream::useAttribute(unsigned int token)
+{
+    unsigned int const element = openElementToken();
+    KVScope* const scope = topScope();
+    if (scope && scope == expectedScope_ && expectedRow_->name &&
+        expectedRow_->elementToken == element && expectedRow_->attributeToken == token &&
+        token != 0) {
+        ++expectedRow_;
+        return;
+    }
+    expectedRow_ = findAttribute(element, token) + 1;
+    expectedScope_ = scope;
 }
 
 template <class T>
 void KVBinaryXMLWriteStream::writeTaggedAttribute(unsigned int token, T const& value)
 {
-    KVScope const* const row = findAttribute(openElementToken(), token);
-    unsigned char bytes[encodedSize];
-    unsigned char const* const end = put(putVarInt(bytes, row->attributeToken), value);
-    attributeBuffer_.write(bytes, static_cast<unsigned long long>(end - bytes));
+    useAttribute(token);
+    if (attributesEnded_)
+        return;
+    unsigned char* const end = put(putVarInt(roomForValue(), token), value);
+    held_ = static_cast<std::size_t>(end - buffer_.get());
     ++attributeCount_;
 }
 
@@ -322,8 +398,30 @@ void KVBinaryXMLWriteStream::writeValue(CMTime const& value)
 void KVBinaryXMLWriteStream::writeValue(KVString const& value)
 {
     static_cast<void>(openElementToken());
-    flushAttributes();
-    writeString(stream_, std::nullopt, value);
+    std::size_t const size = stringSize(value);
+    std::unique_ptr<unsigned char[]> allocated;
+    unsigned char* text;
+    if (size <= heldSize && reserve(size)) {
+        endAttributes();
+        text = buffer_.get() + held_;
+    } else {
+        flushAttributes();
+        allocated.reset(new (std::nothrow) unsigned char[size]);
+        text = allocated.get();
+    }
+    if (!text) {
+        unsigned char const tag = stringTag;
+        stream_.write(&tag, 1);
+        return;
+    }
+    auto const length = static_cast<std::size_t>(put(text, value) - text);
+    if (sent_) {
+        stream_.write(text, length);
+        return;
+    }
+    held_ += length;
+    if (held_ > heldSize)
+        flushAttributes();
 }
 
 // --- Attributes ---
@@ -370,9 +468,17 @@ void KVBinaryXMLWriteStream::writeAttribute(unsigned int token, CMTime const& va
 
 void KVBinaryXMLWriteStream::writeAttribute(unsigned int token, KVString const& value)
 {
-    KVScope const* const row = findAttribute(openElementToken(), token);
-    writeString(attributeBuffer_, row->attributeToken, value);
-    // An empty one is in the buffer and is not counted: so it has always been written.
+    useAttribute(token);
+    if (attributesEnded_)
+        return;
+    bool const fits = reserve(encodedSize + stringSize(value));
+    unsigned char* end = putVarInt(roomForValue(), token);
+    if (fits)
+        end = put(end, value);
+    else
+        *end++ = stringTag;
+    held_ = static_cast<std::size_t>(end - buffer_.get());
+    // An empty one is not counted: so it has always been written.
     if (!value.empty())
         ++attributeCount_;
 }

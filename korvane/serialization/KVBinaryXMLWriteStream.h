@@ -1,10 +1,12 @@
 #pragma once
 
 #include <korvane/foundation/KVURL.h>
-#include <korvane/serialization/KVBufferWriteStream.h>
 #include <korvane/serialization/KVSerializerWriteStream.h>
 
+#include <memory>
 #include <vector>
+
+class KVStream;
 
 /// Writes a document in its compact form: tokens in place of names, values in as few bytes as hold
 /// them, and the length in front of every element, so that a reader can pass over what it does not
@@ -100,17 +102,30 @@ private:
         unsigned long long sizePosition;
     };
 
+    bool reserve(std::size_t size) noexcept;
+    unsigned char* roomForValue();
+    void endAttributes() noexcept;
+    unsigned long long send(bool whole);
+    void writeSize(KVBinaryXMLElementInfo const& element);
+    unsigned int openElementToken() const;
+    void useAttribute(unsigned int token);
     template <class T>
     void writeTagged(T const& value);
     template <class T>
     void writeTaggedAttribute(unsigned int token, T const& value);
-    unsigned int openElementToken() const;
 
     std::vector<KVBinaryXMLElementInfo> elements_;
     KVStream& stream_;
-    KVBufferWriteStream attributeBuffer_;
+    // The attributes and first values of the element that was started last, behind room for its
+    // head, as long as it is held back: a small element goes out in one piece and needs no patch.
+    std::unique_ptr<unsigned char[]> buffer_;
+    std::size_t capacity_ = 0;
+    std::size_t held_ = 0;
     unsigned int attributeCount_ = 0;
-    bool attributesFlushed_ = true;
+    bool attributesEnded_ = true;
+    bool sent_ = true;
     bool cutSizeLogged_ = false;
+    KVScope const* expectedScope_ = nullptr;
+    KVScope const* expectedRow_ = nullptr;
     KVURL url_;
 };

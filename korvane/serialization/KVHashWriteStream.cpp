@@ -1,6 +1,7 @@
 #include <korvane/serialization/KVHashWriteStream.h>
 
 #include <korvane/foundation/KVPrint.h>
+#include <korvane/serialization/KVMD5Blocks_p.h>
 
 #include <cstring>
 #include <string>
@@ -8,7 +9,11 @@
 static_assert(sizeof(CMTime) == 24 && sizeof(KVUUID) == 16 && sizeof(KVHash128) == 16,
               "records are folded in as they lie in memory");
 
-KVHashWriteStream::KVHashWriteStream() noexcept = default;
+KVHashWriteStream::KVHashWriteStream() noexcept
+{
+    reset();
+}
+
 KVHashWriteStream::~KVHashWriteStream() = default;
 
 void KVHashWriteStream::startElement(unsigned int) {}
@@ -24,41 +29,53 @@ void KVHashWriteStream::writeBlankLine() {}
 template <class T>
 [[gnu::always_inline]] inline void KVHashWriteStream::fold(T const& value) noexcept
 {
-    if (remaining() < sizeof value) [[unlikely]] {
+    if (room() < sizeof value) [[unlikely]] {
         T const copy = value; // so that the value itself may stay in a register
-        return foldAcrossRefill(reinterpret_cast<unsigned char const*>(&copy), sizeof copy);
+        return foldBytes(reinterpret_cast<unsigned char const*>(&copy), sizeof copy);
     }
     std::memcpy(cursor_, &value, sizeof value);
     cursor_ += sizeof value;
 }
 
-/// Fills the buffer to its end before it goes to the hash, and leaves a full one to the next value:
-/// that is where `reset` cuts.
-void KVHashWriteStream::foldAcrossRefill(unsigned char const* data, std::size_t length) noexcept
+void KVHashWriteStream::foldBytes(unsigned char const* data, std::size_t length) noexcept
 {
-    while (length > remaining()) {
-        if (cursor_ == buffer_) {
-            // Nothing waits: take whole buffers from where they lie.
-            hash_.addData(data, bufferSize);
-            data += bufferSize;
-            length -= bufferSize;
+    while (length > room()) {
+        if (cursor_ == buffer_ && length > bufferSize) {
+            // Whole buffers are taken from where they lie.
+            auto const whole = (length - 1) / bufferSize * bufferSize;
+            kv::md5Blocks(ahead_.words, data, whole / blockSize);
+            hash_ = ahead_;
+            data += whole;
+            length -= whole;
             continue;
         }
-        std::size_t const room = remaining();
-        std::memcpy(cursor_, data, room);
-        data += room;
-        length -= room;
-        hash_.addData(buffer_, bufferSize);
-        cursor_ = buffer_;
+        std::size_t const fitting = room();
+        std::memcpy(cursor_, data, fitting);
+        data += fitting;
+        length -= fitting;
+        endBlock();
     }
     std::memcpy(cursor_, data, length);
     cursor_ += length;
 }
 
+/// Runs the hash ahead over the block that has become full. The processor works at it while the
+/// next values come in. A full buffer is kept until more comes: that is where `reset` cuts.
+void KVHashWriteStream::endBlock() noexcept
+{
+    kv::md5Blocks(ahead_.words, blockEnd_ - blockSize, 1);
+    cursor_ = blockEnd_;
+    if (blockEnd_ == buffer_ + bufferSize) {
+        hash_ = ahead_;
+        cursor_ = buffer_;
+    }
+    blockEnd_ = cursor_ + blockSize;
+}
+
 void KVHashWriteStream::writeData(void const* data, unsigned int length)
 {
     if (length > 0)
-        foldAcrossRefill(static_cast<unsigned char const*>(data), length);
+        foldBytes(static_cast<unsigned char const*>(data), length);
 }
 
 // --- Values ---
@@ -101,8 +118,8 @@ void KVHashWriteStream::writeValue(KVUUID const& value)
 void KVHashWriteStream::writeValue(KVString const& value)
 {
     if (char16_t const* const units = value.u_str())
-        foldAcrossRefill(reinterpret_cast<unsigned char const*>(units),
-                         sizeof *units * (std::size_t(value.size()) + 1));
+        foldBytes(reinterpret_cast<unsigned char const*>(units),
+                  sizeof *units * (std::size_t(value.size()) + 1));
 }
 
 void KVHashWriteStream::writeValue(CMTime const& value)
@@ -123,7 +140,7 @@ void KVHashWriteStream::writeValue(KVHash128 const& value)
 void KVHashWriteStream::writeValue(char const* text)
 {
     if (text)
-        foldAcrossRefill(reinterpret_cast<unsigned char const*>(text), std::strlen(text));
+        foldBytes(reinterpret_cast<unsigned char const*>(text), std::strlen(text));
 }
 
 void KVHashWriteStream::writeValue(bool value)
@@ -209,8 +226,9 @@ void KVHashWriteStream::close()
 {
     if (cursor_ == buffer_)
         return;
-    hash_.addData(buffer_, static_cast<unsigned int>(cursor_ - buffer_));
-    reset();
+    unsigned char const* const block = blockEnd_ - blockSize;
+    ahead_.addData(block, static_cast<unsigned int>(cursor_ - block));
+    setHash(ahead_);
 }
 
 KVHash128 const& KVHashWriteStream::getHash()
@@ -222,12 +240,15 @@ KVHash128 const& KVHashWriteStream::getHash()
 void KVHashWriteStream::setHash(KVHash128 const& hash) noexcept
 {
     hash_ = hash;
-    cursor_ = buffer_;
+    reset();
 }
 
-void KVHashWriteStream::reset()
+void KVHashWriteStream::reset() noexcept
 {
+    ahead_ = hash_;
+    ahead_.addData(nullptr, 0); // starts it
     cursor_ = buffer_;
+    blockEnd_ = buffer_ + blockSize;
 }
 
 bool KVHashWriteStream::isHashStream()

@@ -87,7 +87,7 @@ public:
     /// Goes on from `hash`, without what the buffer holds.
     void setHash(KVHash128 const& hash) noexcept;
     /// Throws away what the buffer holds and keeps the hash.
-    void reset() override;
+    void reset() noexcept override;
     /// True.
     bool isHashStream() override;
     /// Prints the bytes in the buffer on one line in hexadecimal, through KVPrint.
@@ -95,16 +95,19 @@ public:
 
 private:
     static constexpr unsigned int bufferSize = 4096;
+    static constexpr unsigned int blockSize = 64;
 
-    std::size_t remaining() const noexcept
-    {
-        return static_cast<std::size_t>(buffer_ + bufferSize - cursor_);
-    }
+    std::size_t room() const noexcept { return static_cast<std::size_t>(blockEnd_ - cursor_); }
     template <class T>
     void fold(T const& value) noexcept;
-    void foldAcrossRefill(unsigned char const* data, std::size_t length) noexcept;
+    void foldBytes(unsigned char const* data, std::size_t length) noexcept;
+    void endBlock() noexcept;
 
     KVHash128 hash_;
-    unsigned char* cursor_ = buffer_;
+    // The hash with the full blocks of the buffer in it; always started.
+    KVHash128 ahead_;
+    unsigned char* cursor_;
+    // The end of the block that is being filled.
+    unsigned char* blockEnd_;
     unsigned char buffer_[bufferSize];
 };

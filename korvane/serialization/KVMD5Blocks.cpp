@@ -41,12 +41,12 @@ constexpr unsigned wordOfStep(unsigned step) noexcept
 #endif
 }
 
-template <unsigned Step>
+template <unsigned Step, class Words>
 [[gnu::always_inline]] inline void step(std::uint32_t& a, std::uint32_t b, std::uint32_t c,
-                                        std::uint32_t d, std::uint32_t const* words) noexcept
+                                        std::uint32_t d, Words words) noexcept
 {
     constexpr unsigned round = Step / 16;
-    a += words[wordOfStep(Step)] + sines[Step];
+    a += words(wordOfStep(Step)) + sines[Step];
     if constexpr (round == 0) {
         formedBefore(a);
         a += d ^ (b & (c ^ d));
@@ -65,8 +65,8 @@ template <unsigned Step>
     a = std::rotl(a, shifts[round][Step % 4]) + b;
 }
 
-template <std::size_t... Four>
-[[gnu::always_inline]] inline void allSteps(std::uint32_t (&s)[4], std::uint32_t const* words,
+template <class Words, std::size_t... Four>
+[[gnu::always_inline]] inline void allSteps(std::uint32_t (&s)[4], Words words,
                                             std::index_sequence<Four...>) noexcept
 {
     std::uint32_t a = s[0], b = s[1], c = s[2], d = s[3];
@@ -79,24 +79,28 @@ template <std::size_t... Four>
     s[3] += d;
 }
 
+std::uint32_t littleEndian(unsigned char const* bytes) noexcept
+{
+    std::uint32_t word;
+    std::memcpy(&word, bytes, sizeof word);
+    return std::endian::native == std::endian::little ? word : __builtin_bswap32(word);
+}
+
 } // namespace
 
 void md5Block(std::uint32_t (&state)[4], std::uint32_t const (&words)[16]) noexcept
 {
-    allSteps(state, words, std::make_index_sequence<16>());
+    allSteps(
+        state, [&](unsigned i) { return words[i]; }, std::make_index_sequence<16>());
 }
 
 void md5Blocks(std::uint32_t (&state)[4], unsigned char const* data, std::size_t count) noexcept
 {
     std::uint32_t s[4] = {state[0], state[1], state[2], state[3]};
-    for (; count > 0; --count, data += 64) {
-        std::uint32_t words[16];
-        std::memcpy(words, data, sizeof words);
-        if constexpr (std::endian::native == std::endian::big)
-            for (auto& word : words)
-                word = __builtin_bswap32(word);
-        allSteps(s, words, std::make_index_sequence<16>());
-    }
+    for (; count > 0; --count, data += 64)
+        allSteps(
+            s, [data](unsigned i) { return littleEndian(data + 4 * i); },
+            std::make_index_sequence<16>());
     std::memcpy(state, s, sizeof s);
 }
 

@@ -1,5 +1,7 @@
 #include <korvane/serialization/KVNumberText_p.h>
 
+#include <algorithm>
+#include <bit>
 #include <cerrno>
 #include <charconv>
 #include <clocale>
@@ -24,15 +26,14 @@ char* formatHexWord(char* out, std::uint32_t word) noexcept
     return out;
 }
 
-/// 16 for what is no hexadecimal digit.
+/// 16 or more for what is no hexadecimal digit.
 constexpr unsigned int digitValue(char c) noexcept
 {
-    if (c >= '0' && c <= '9')
-        return static_cast<unsigned int>(c - '0');
-    char const lower = static_cast<char>(c | 0x20);
-    if (lower >= 'a' && lower <= 'f')
-        return static_cast<unsigned int>(lower - 'a' + 10);
-    return 16;
+    unsigned int const decimal = static_cast<unsigned char>(c) - unsigned('0');
+    if (decimal < 10)
+        return decimal;
+    unsigned int const letter = (static_cast<unsigned char>(c) | 0x20u) - unsigned('a');
+    return letter < 6 ? letter + 10 : 16;
 }
 
 char const* skipSpace(char const* text) noexcept
@@ -51,7 +52,8 @@ struct Integer {
     char const* end = nullptr;
 };
 
-Integer readInteger(char const* text, unsigned int base) noexcept
+template <unsigned int base>
+Integer readInteger(char const* text) noexcept
 {
     Integer result;
     text = skipSpace(text);
@@ -59,9 +61,19 @@ Integer readInteger(char const* text, unsigned int base) noexcept
         result.negative = *text++ == '-';
     if (base == 16 && text[0] == '0' && (text[1] | 0x20) == 'x' && digitValue(text[2]) < 16)
         text += 2;
-    for (unsigned int digit; (digit = digitValue(*text)) < base; result.end = ++text)
+    char const* const start = text;
+    unsigned int digit;
+    // So many digits fit without a look.
+    char const* const safeEnd = start + (base == 16 ? 16 : 19);
+    while (text != safeEnd && (digit = digitValue(*text)) < base) {
+        result.magnitude = result.magnitude * base + digit;
+        ++text;
+    }
+    for (; (digit = digitValue(*text)) < base; ++text)
         result.overflow |= __builtin_mul_overflow(result.magnitude, base, &result.magnitude) ||
                            __builtin_add_overflow(result.magnitude, digit, &result.magnitude);
+    if (text != start)
+        result.end = text;
     return result;
 }
 
@@ -81,39 +93,106 @@ double convert(char const* text, char** end, double) noexcept
     return strtod_l(text, end, cLocale());
 }
 
-/// Behind a plain decimal number at `text`; null if what stands there is none.
-char const* endOfDecimal(char const* text) noexcept
+/// A decimal number without a sign: `digits` times ten to the power of `exponent`.
+struct Decimal {
+    unsigned long long digits = 0;
+    long exponent = 0;
+    /// `digits` holds all that there are.
+    bool isWhole = true;
+    /// Behind it; null if what stands there is no plain decimal number.
+    char const* end = nullptr;
+};
+
+Decimal readDecimal(char const* text) noexcept
 {
+    Decimal result;
+    constexpr unsigned long long most = (std::numeric_limits<unsigned long long>::max() - 9) / 10;
+    auto const takeDigits = [&](bool areDecimals) {
+        for (unsigned int digit; (digit = digitValue(*text)) < 10; ++text) {
+            if (result.digits <= most) {
+                result.digits = result.digits * 10 + digit;
+                result.exponent -= areDecimals;
+            } else {
+                result.isWhole = false;
+            }
+        }
+    };
     char const* const start = text;
-    while (digitValue(*text) < 10)
-        ++text;
+    takeDigits(false);
     if (text == start || (*text | 0x20) == 'x')
-        return nullptr;
-    if (*text == '.')
-        while (digitValue(*++text) < 10)
-            ;
+        return result;
+    if (*text == '.') {
+        ++text;
+        takeDigits(true);
+    }
     if ((*text | 0x20) == 'e') {
-        char const* exponent = text + 1;
-        if (*exponent == '-' || *exponent == '+')
-            ++exponent;
-        if (digitValue(*exponent) < 10) {
-            while (digitValue(*exponent) < 10)
-                ++exponent;
-            return exponent;
+        char const* digits = text + 1;
+        bool const negative = *digits == '-';
+        digits += negative || *digits == '+';
+        if (digitValue(*digits) < 10) {
+            long exponent = 0;
+            for (text = digits; digitValue(*text) < 10; ++text)
+                exponent = std::min(exponent * 10 + *text - '0', 1'000'000l);
+            result.exponent += negative ? -exponent : exponent;
         }
     }
-    return text;
+    result.end = text;
+    return result;
+}
+
+/// The nearest double, where two exact ones make it in one operation (Clinger, How to read
+/// floating point numbers accurately, 1990).
+bool toDouble(Decimal const& decimal, double& value) noexcept
+{
+    static constexpr double powers[] = {1e0,  1e1,  1e2,  1e3,  1e4,  1e5,  1e6,  1e7,
+                                        1e8,  1e9,  1e10, 1e11, 1e12, 1e13, 1e14, 1e15,
+                                        1e16, 1e17, 1e18, 1e19, 1e20, 1e21, 1e22};
+    if (!decimal.isWhole || decimal.digits > 1ull << 53 || decimal.exponent < -22 ||
+        decimal.exponent > 22)
+        return false;
+    auto const digits = static_cast<double>(decimal.digits);
+    value = decimal.exponent < 0 ? digits / powers[-decimal.exponent]
+                                 : digits * powers[decimal.exponent];
+    return true;
+}
+
+bool convertQuickly(Decimal const& decimal, double& value) noexcept
+{
+    return toDouble(decimal, value);
+}
+
+/// Rounding twice gives another float than rounding once only where the double lies half-way
+/// between two floats.
+bool convertQuickly(Decimal const& decimal, float& value) noexcept
+{
+    double wide;
+    if (!toDouble(decimal, wide))
+        return false;
+    constexpr std::uint64_t lostBits = (1u << 29) - 1;
+    constexpr std::uint64_t halfWay = 1u << 28;
+    bool const isNormal = wide == 0 || (wide >= std::numeric_limits<float>::min() &&
+                                        wide <= std::numeric_limits<float>::max());
+    if (!isNormal || (std::bit_cast<std::uint64_t>(wide) & lostBits) == halfWay)
+        return false;
+    value = static_cast<float>(wide);
+    return true;
 }
 
 template <class T>
 bool parseFloat(char const*& cursor, T& value) noexcept
 {
-    char const* text = skipSpace(cursor);
+    char const* const text = skipSpace(cursor);
     bool const negative = *text == '-';
-    if (char const* const end = endOfDecimal(text + negative)) {
-        auto const [last, error] = std::from_chars(text, end, value);
-        if (error == std::errc()) {
-            cursor = last;
+    Decimal const decimal = readDecimal(text + negative);
+    if (decimal.end) {
+        if (convertQuickly(decimal, value)) {
+            if (negative)
+                value = -value;
+            cursor = decimal.end;
+            return true;
+        }
+        if (std::from_chars(text, decimal.end, value).ec == std::errc()) {
+            cursor = decimal.end;
             return true;
         }
     }
@@ -184,8 +263,20 @@ char* kvFormat(char* out, CMTime const& value) noexcept
 
 bool kvParseInt(char const*& cursor, long long& value) noexcept
 {
+    // Most numbers are short.
+    char const* text = skipSpace(cursor);
+    bool const negative = *text == '-';
+    char const* const start = text += negative;
+    long long magnitude = 0;
+    for (unsigned int digit; (digit = digitValue(*text)) < 10 && text - start < 18; ++text)
+        magnitude = magnitude * 10 + digit;
+    if (text != start && digitValue(*text) >= 10) {
+        value = negative ? -magnitude : magnitude;
+        cursor = text;
+        return true;
+    }
     using Limits = std::numeric_limits<long long>;
-    Integer const integer = readInteger(cursor, 10);
+    Integer const integer = readInteger<10>(cursor);
     unsigned long long const most =
         static_cast<unsigned long long>(Limits::max()) + (integer.negative ? 1 : 0);
     if (integer.overflow || integer.magnitude > most) {
@@ -200,7 +291,7 @@ bool kvParseInt(char const*& cursor, long long& value) noexcept
 
 bool kvParseUInt(char const*& cursor, unsigned long long& value, unsigned int base) noexcept
 {
-    Integer const integer = readInteger(cursor, base);
+    Integer const integer = base == 16 ? readInteger<16>(cursor) : readInteger<10>(cursor);
     if (integer.overflow) {
         value = std::numeric_limits<unsigned long long>::max();
         return false;

@@ -73,10 +73,11 @@ void KVSerializerReadStream::popElement()
     KVStreamElement* const element = elements_.back();
     // A later element may get the same address: no handler may go on naming this one. Handlers
     // of the elements around it stand further down.
-    for (auto info = handlers_.rbegin(); info != handlers_.rend(); ++info) {
-        if (info->element == element)
-            info->element = nullptr;
-        else if (info->element)
+    for (std::size_t i = handlers_.size(); i-- > 0;) {
+        HandlerInfo& info = handlers_[i];
+        if (info.element == element)
+            info.element = nullptr;
+        else if (info.element)
             break;
     }
     elements_.pop_back();

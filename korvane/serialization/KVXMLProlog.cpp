@@ -21,6 +21,8 @@ using Kind = KVXMLProlog::Kind;
 constexpr std::size_t npos = std::string_view::npos;
 constexpr std::size_t mostOfSubset = 8192;
 constexpr char blanks[] = " \t\r\n";
+/// In the place of characters that are not ASCII: means nothing in any construct.
+constexpr char notASCII = '\x7F';
 
 struct Finding {
     Kind kind;
@@ -42,15 +44,23 @@ std::size_t findPast(std::string_view text, std::string_view end, std::size_t at
     return found == npos ? npos : found + end.size();
 }
 
-/// The end of a comment or an instruction that starts at `at`; `at` itself if none starts there.
-std::size_t skipAside(std::string_view text, std::size_t at)
+/// Goes behind a comment or an instruction, if one starts at `at`.
+Finding skipAside(std::string_view text, std::size_t& at)
 {
     std::string_view const rest = text.substr(at);
-    if (rest.starts_with("<!--"))
-        return findPast(text, "-->", at + 4);
-    if (rest.starts_with("<?"))
-        return findPast(text, "?>", at + 2);
-    return at;
+    if (rest.starts_with("<!--")) {
+        std::size_t const dashes = text.find("--", at + 4);
+        if (dashes == npos || dashes + 2 == text.size())
+            return incomplete;
+        if (text[dashes + 2] != '>')
+            return refuse("a comment holds two dashes", dashes);
+        at = dashes + 3;
+    } else if (rest.starts_with("<?")) {
+        at = findPast(text, "?>", at + 2);
+        if (at == npos)
+            return incomplete;
+    }
+    return fine;
 }
 
 /// Whether the text of an entity, once its character references are replaced as they are when it is
@@ -115,19 +125,19 @@ Finding scanDeclarations(std::string_view text, std::size_t at)
         std::string_view const rest = text.substr(at);
         if (rest.size() < sizeof "<!ENTITY" - 1)
             return incomplete;
-        if (std::size_t const end = skipAside(text, at); end != at) {
-            if (end == npos)
-                return incomplete;
-            at = end;
-        } else if (rest.starts_with("<!")) {
+        std::size_t const start = at;
+        if (Finding const finding = skipAside(text, at); finding.kind != Kind::fine)
+            return finding;
+        if (at != start)
+            continue;
+        if (rest.starts_with("<!")) {
             bool const isEntity = rest.starts_with("<!ENTITY");
-            std::size_t const declared = at;
             if (isEntity) {
                 at = text.find_first_not_of(blanks, at + sizeof "<!ENTITY" - 1);
                 if (at == npos)
                     return incomplete;
                 if (text[at] == '%')
-                    return refuse("a parameter entity is declared", declared);
+                    return refuse("a parameter entity is declared", start);
             }
             if (Finding const finding = scanDeclaration(text, at, isEntity);
                 finding.kind != Kind::fine)
@@ -206,59 +216,59 @@ Finding scan(std::string_view text, bool isWide)
         if (at == npos)
             return incomplete;
         std::string_view const rest = text.substr(at);
-        if (std::size_t const end = skipAside(text, at); end != at) {
-            if (end == npos)
-                return incomplete;
-            at = end;
-        } else if (rest.starts_with(documentType)) {
+        std::size_t const start = at;
+        if (Finding const finding = skipAside(text, at); finding.kind != Kind::fine)
+            return finding;
+        if (at != start)
+            continue;
+        if (rest.starts_with(documentType))
             return scanDocumentType(text, at + documentType.size());
-        } else {
-            // The start of an element, unless what is here could still become one of the above.
-            bool const open =
-                documentType.starts_with(rest) || std::string_view("<!--").starts_with(rest);
-            return open ? incomplete : fine;
-        }
+        // The start of an element, unless what is here could still become one of the above.
+        bool const open =
+            documentType.starts_with(rest) || std::string_view("<!--").starts_with(rest);
+        return open ? incomplete : fine;
     }
 }
 
-/// 1, or 2 for UTF-16; 0 for an encoding in which even ASCII looks different.
-int bytesOfUnit(std::string_view bytes, bool& bigEndian)
+} // namespace
+
+KVXMLEncoding kvDetectEncoding(std::string_view bytes)
 {
     auto const starts = [bytes](std::string_view mark) { return bytes.starts_with(mark); };
     using namespace std::string_view_literals;
     if (starts("\0\0\xFE\xFF"sv) || starts("\xFF\xFE\0\0"sv) || starts("\0\0\0<"sv) ||
         starts("<\0\0\0"sv) || starts("\0\0<\0"sv) || starts("\0<\0\0"sv) ||
         starts("\x4C\x6F\xA7\x94"sv))
-        return 0;
-    bigEndian = starts("\xFE\xFF"sv) || starts("\0<"sv);
-    return bigEndian || starts("\xFF\xFE"sv) || starts("<\0"sv) ? 2 : 1;
+        return {0, false};
+    bool const bigEndian = starts("\xFE\xFF"sv) || starts("\0<"sv);
+    return {bigEndian || starts("\xFF\xFE"sv) || starts("<\0"sv) ? 2 : 1, bigEndian};
 }
 
-} // namespace
-
-KVXMLProlog kvScanProlog(std::string_view bytes)
+std::string_view kvNarrowed(KVXMLEncoding encoding, std::string_view bytes, std::string& buffer)
 {
-    bool bigEndian = false;
-    int const width = bytesOfUnit(bytes, bigEndian);
-    if (width == 0)
-        return {Kind::refused, "its encoding is not read", 1};
-    std::string narrowed;
-    if (width == 2) {
-        // Stands for all that is not ASCII, and means nothing in any construct.
-        constexpr char other = '\x7F';
-        for (std::size_t i = 0; i + 1 < bytes.size(); i += 2) {
-            char const high = bytes[i + (bigEndian ? 0 : 1)];
-            char const low = bytes[i + (bigEndian ? 1 : 0)];
-            narrowed += high == 0 && static_cast<unsigned char>(low) < 0x80 ? low : other;
-        }
-        if (narrowed.starts_with(other))
-            narrowed.erase(0, 1); // the byte order mark
-        bytes = narrowed;
-    } else if (bytes.starts_with("\xEF\xBB\xBF")) {
-        bytes.remove_prefix(3);
+    if (encoding.width != 2)
+        return bytes;
+    buffer.clear();
+    for (std::size_t i = 0; i + 1 < bytes.size(); i += 2) {
+        char const high = bytes[i + (encoding.bigEndian ? 0 : 1)];
+        char const low = bytes[i + (encoding.bigEndian ? 1 : 0)];
+        buffer += high == 0 && static_cast<unsigned char>(low) < 0x80 ? low : notASCII;
     }
-    Finding const finding = scan(bytes, width == 2);
+    return buffer;
+}
+
+KVXMLProlog kvScanProlog(KVXMLEncoding encoding, std::string_view bytes)
+{
+    if (encoding.width == 0)
+        return {Kind::refused, "its encoding is not read", 1};
+    std::string buffer;
+    std::string_view text = kvNarrowed(encoding, bytes, buffer);
+    if (encoding.width == 2 && text.starts_with(notASCII))
+        text.remove_prefix(1); // the byte order mark
+    else if (text.starts_with("\xEF\xBB\xBF"))
+        text.remove_prefix(3);
+    Finding const finding = scan(text, encoding.width == 2);
     auto const lines =
-        std::count(bytes.begin(), bytes.begin() + static_cast<std::ptrdiff_t>(finding.at), '\n');
+        std::count(text.begin(), text.begin() + static_cast<std::ptrdiff_t>(finding.at), '\n');
     return {finding.kind, finding.reason, static_cast<unsigned long>(lines) + 1};
 }

@@ -2,6 +2,7 @@
 
 #include <korvane/serialization/KVNumberText_p.h>
 #include <korvane/serialization/KVXMLLocale_p.h>
+#include <korvane/serialization/KVXMLMarkup_p.h>
 #include <korvane/serialization/KVXMLNameCache_p.h>
 #include <korvane/serialization/KVXMLSource_p.h>
 #include <korvane/serialization/KVXMLStreamElement.h>
@@ -10,7 +11,6 @@
 #include <array>
 #include <cstdio>
 #include <cstring>
-#include <functional>
 #include <new>
 #include <string>
 #include <system_error>
@@ -21,6 +21,9 @@
 namespace {
 
 constexpr std::size_t elementsOfArena = 16;
+
+/// A document has some hundred different names. libxml2's look-up slows down with their number.
+constexpr int mostNames = 100'000;
 
 /// What all attributes of a document together may take from entities, in bytes.
 constexpr std::size_t mostFromEntities = 10'000'000;
@@ -48,7 +51,9 @@ struct KVXMLReadStream::Reader {
     ~Reader() { xmlFreeTextReader(reader); }
 
     void open();
+    static int giveBytes(void* self, char* out, int length);
     bool next();
+    void beginRoot(xmlDoc& document) noexcept;
     unsigned long line() const noexcept;
     void fail(char const* text, unsigned long atLine);
     static void keepError(void* self, xmlErrorPtr error);
@@ -64,6 +69,10 @@ struct KVXMLReadStream::Reader {
     /// The document is given up, whatever libxml2 thinks of it.
     bool failed = false;
 
+    KVXMLMarkup markup;
+
+    /// Where libxml2 keeps the names of the document, from the root element on.
+    xmlDict* dictionary = nullptr;
     KVXMLNameCache names;
     std::array<Slot, elementsOfArena> arena;
     std::size_t bytesFromEntities = 0;
@@ -82,13 +91,34 @@ void KVXMLReadStream::Reader::open()
         fail(prolog.reason, prolog.line);
         return;
     }
-    auto const read = [](void* bytes, char* out, int length) {
-        return static_cast<KVXMLSource*>(bytes)->read(out, length);
-    };
+    markup = KVXMLMarkup(source.encoding());
     auto const close = [](void*) { return 0; };
-    reader = xmlReaderForIO(read, close, &source, nullptr, nullptr, XML_PARSE_HUGE);
+    reader = xmlReaderForIO(giveBytes, close, this, nullptr, nullptr, XML_PARSE_HUGE);
     if (reader)
         xmlTextReaderSetStructuredErrorHandler(reader, keepError, this);
+}
+
+int KVXMLReadStream::Reader::giveBytes(void* self, char* out, int length)
+{
+    auto& giver = *static_cast<Reader*>(self);
+    try {
+        long const consumed = giver.reader ? xmlTextReaderByteConsumed(giver.reader) : 0;
+        std::string_view const waiting =
+            giver.source.givenFrom(consumed > 0 ? static_cast<unsigned long long>(consumed) : 0);
+        char const* reason = nullptr;
+        if (waiting.size() > KVXMLMarkup::harmless)
+            reason = giver.markup.check(giver.source.given() - waiting.size(), waiting);
+        else if (giver.dictionary && xmlDictSize(giver.dictionary) > mostNames)
+            reason = "it has more than 100000 different names";
+        if (!reason)
+            return giver.source.read(out, length);
+        int const line = xmlTextReaderGetParserLineNumber(giver.reader);
+        giver.fail(reason, static_cast<unsigned long>(std::max(line, 0)));
+        return -1;
+    } catch (std::exception const&) {
+        giver.fail("there is not enough memory", 0);
+        return -1;
+    }
 }
 
 /// Goes to the next node, if that has not been done, and answers whether there is one.
@@ -98,6 +128,19 @@ bool KVXMLReadStream::Reader::next()
         result = xmlTextReaderRead(reader);
     hasNext = false;
     return result >= 1;
+}
+
+void KVXMLReadStream::Reader::beginRoot(xmlDoc& document) noexcept
+{
+    dictionary = document.dict;
+    // A document type that declares nothing is all that a scene has. Without it libxml2 does not
+    // look every attribute up there.
+    xmlDtd* const type = document.intSubset;
+    if (type && !type->elements && !type->attributes && !type->entities && !type->notations &&
+        !type->pentities) {
+        xmlUnlinkNode(reinterpret_cast<xmlNode*>(type));
+        xmlFreeDtd(type);
+    }
 }
 
 /// Of the node that the reader stands on. libxml2 keeps 16 bits of it; behind those this is how far
@@ -150,13 +193,9 @@ std::string KVXMLReadStream::Reader::valueWithEntities(xmlAttr const& attribute)
 KVXMLReadStream::Reader::Slot*
 KVXMLReadStream::Reader::slotOf(KVStreamElement const* element) noexcept
 {
-    void const* const address = element;
-    std::less<void const*> const before;
-    if (before(address, arena.data()) || !before(address, arena.data() + arena.size()))
-        return nullptr;
-    auto const offset = static_cast<std::size_t>(static_cast<std::byte const*>(address) -
-                                                 reinterpret_cast<std::byte const*>(arena.data()));
-    return &arena[offset / sizeof(Slot)];
+    std::uintptr_t const offset =
+        reinterpret_cast<std::uintptr_t>(element) - reinterpret_cast<std::uintptr_t>(arena.data());
+    return offset < sizeof arena ? &arena[offset / sizeof(Slot)] : nullptr;
 }
 
 // --- Construction ---
@@ -231,8 +270,7 @@ void KVXMLReadStream::stopParse()
 void KVXMLReadStream::processNode()
 {
     xmlTextReaderPtr const reader = reader_->reader;
-    xmlNode const* const node = reader ? xmlTextReaderCurrentNode(reader) : nullptr;
-    if (!node)
+    if (!reader)
         return;
     switch (xmlTextReaderNodeType(reader)) {
     case XML_READER_TYPE_ELEMENT:
@@ -246,7 +284,7 @@ void KVXMLReadStream::processNode()
         addText(true);
         break;
     case XML_READER_TYPE_ENTITY_REFERENCE:
-        addEntity(chars(node->name));
+        addEntity(chars(xmlTextReaderConstName(reader)));
         break;
     case XML_READER_TYPE_END_ELEMENT:
         endElement();
@@ -262,23 +300,21 @@ void KVXMLReadStream::startElement()
     Reader& reader = *reader_;
     if (KVStreamElement* const parent = currentElement(); parent && !parent->processed)
         processElement(*parent);
+    if (!reader.dictionary)
+        reader.beginRoot(*xmlTextReaderCurrentNode(reader.reader)->doc);
 
     xmlChar const* const qualifiedName = xmlTextReaderConstName(reader.reader);
     char const* const name = qualifiedName ? chars(qualifiedName) : "--";
-    KVScope* row = nullptr;
-    KVScope* scope = nullptr;
     if (KVSerializer* const handler = currentHandler()) {
         for (KVScope* const table : currentScopes()) {
-            if (table && (row = reader.names.element(table, name))) {
-                scope = table;
-                break;
-            }
-        }
-        if (row) {
-            auto* const element =
-                static_cast<KVXMLStreamElement*>(createElement(row->elementToken, scope, handler));
-            pushElement(element);
-            addAttributes(*element);
+            KVScope const* const row = table ? reader.names.element(table, name) : nullptr;
+            if (!row)
+                continue;
+            pushElement(createElement(row->elementToken, table, handler));
+            auto& element = static_cast<KVXMLStreamElement&>(*currentElement());
+            if (reader.observer)
+                element.line_ = reader.line();
+            addAttributes(element);
             if (xmlTextReaderIsEmptyElement(reader.reader) == 1)
                 endElement();
             return;
@@ -348,9 +384,9 @@ void KVXMLReadStream::addText(bool blanksAlone)
         return;
     if (blanksAlone && !(element->handler && element->handler->readSignificantWhiteSpace()))
         return;
-    if (xmlChar const* const text = xmlTextReaderCurrentNode(reader_->reader)->content)
-        static_cast<KVXMLStreamElement*>(element)->appendContentWithNewline(
-            chars(text), std::strlen(chars(text)), !afterEntity_);
+    // The virtual form: a host may have pushed an element of its own.
+    if (xmlChar* const text = xmlTextReaderCurrentNode(reader_->reader)->content)
+        element->appendContentWithNewline(reinterpret_cast<char*>(text), !afterEntity_);
     afterEntity_ = false;
 }
 
@@ -368,7 +404,7 @@ char byteOfReference(char const* digits, bool hexadecimal)
 
 void KVXMLReadStream::addEntity(char const* name)
 {
-    auto* const element = static_cast<KVXMLStreamElement*>(currentElement());
+    KVStreamElement* const element = currentElement();
     if (!element)
         return;
     static constexpr struct {
@@ -376,14 +412,15 @@ void KVXMLReadStream::addEntity(char const* name)
         char text;
     } table[] = {{"amp", '&'},  {"lt", '<'},    {"gt", '>'},
                  {"quot", '"'}, {"apos", '\''}, {"space", ' '}};
-    char text = '\0';
+    char text[2] = {};
     if (name[0] == '#')
-        text = name[1] == 'x' ? byteOfReference(name + 2, true) : byteOfReference(name + 1, false);
+        text[0] =
+            name[1] == 'x' ? byteOfReference(name + 2, true) : byteOfReference(name + 1, false);
     else
         for (auto const& entity : table)
             if (std::strcmp(entity.name, name) == 0)
-                text = entity.text;
-    element->appendContentWithNewline(&text, text != '\0', false);
+                text[0] = entity.text;
+    element->appendContentWithNewline(text, false);
     afterEntity_ = true;
 }
 
@@ -395,8 +432,7 @@ KVStreamElement* KVXMLReadStream::createElement(unsigned int token, KVScope* sco
     if (elementCount_ < elementsOfArena && !reader_->arena[elementCount_].used) {
         Reader::Slot& slot = reader_->arena[elementCount_++];
         slot.used = true;
-        return new (slot.element)
-            KVXMLStreamElement(token, scope, handler, std::move(slot.storage));
+        return new (slot.element) KVXMLStreamElement(token, scope, handler, slot.storage);
     }
     auto* const element = new KVXMLStreamElement(token, scope, handler);
     ++elementCount_;
@@ -408,9 +444,7 @@ void KVXMLReadStream::destroyElement(KVStreamElement* element)
     if (elementCount_ > 0)
         --elementCount_;
     if (Reader::Slot* const slot = reader_->slotOf(element)) {
-        auto* const own = static_cast<KVXMLStreamElement*>(element);
-        slot->storage = own->releaseStorage();
-        own->~KVXMLStreamElement();
+        static_cast<KVXMLStreamElement*>(element)->~KVXMLStreamElement();
         slot->used = false;
     } else {
         delete element;

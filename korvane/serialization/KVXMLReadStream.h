@@ -34,8 +34,9 @@ public:
 ///
 /// Nothing outside the document is loaded. A document is refused, as one that is not well-formed
 /// is, whose document type declares parameter entities, entities that refer to further ones or more
-/// than 8192 characters, whose attributes take more than 10 million bytes from entities, or whose
-/// encoding is none of UTF-8, UTF-16, US-ASCII, ISO-8859-* and windows-125*.
+/// than 8192 characters, whose attributes take more than 10 million bytes from entities, which
+/// holds a tag or comment of more than 9 million bytes (text has no such limit), or whose encoding
+/// is none of UTF-8, UTF-16, US-ASCII, ISO-8859-* and windows-125*.
 class KV_EXPORT KVXMLReadStream : public KVSerializerReadStream {
 public:
     /// Opens the file. Sets the process's LC_NUMERIC to "C" if it is not; so do the other two.

@@ -8,6 +8,8 @@ namespace {
 constexpr std::size_t windowSize = 65536;
 /// A document's root element must start within that many bytes.
 constexpr std::size_t mostOfProlog = 1 << 20;
+/// libxml2 moves all that it holds after each kilobyte that it has read: let it not hold much.
+constexpr int mostOfPiece = 1024;
 
 } // namespace
 
@@ -16,49 +18,64 @@ int KVXMLSource::openFile(KVURL const& url)
     int const failure = file_.openForReading(url);
     if (failure != 0)
         return failure;
-    window_.resize(windowSize);
     atEnd_ = false;
-    fillWindow(windowSize);
+    fillWindow();
     return error_;
 }
 
-void KVXMLSource::fillWindow(std::size_t size)
+void KVXMLSource::fillWindow()
 {
-    std::size_t const kept = bytes_.size();
-    if (window_.size() < size)
-        window_.resize(size);
+    window_.erase(window_.begin(), window_.begin() + static_cast<std::ptrdiff_t>(unneeded_));
+    start_ += unneeded_;
+    given_ -= unneeded_;
+    unneeded_ = 0;
+    std::size_t const kept = window_.size();
+    window_.resize(kept + windowSize);
     unsigned long long count;
-    error_ = file_.read(window_.data() + kept, size - kept, &count);
-    atEnd_ = error_ != 0 || count < size - kept;
-    bytes_ = std::string_view(window_.data(), kept + count);
+    error_ = file_.read(window_.data() + kept, windowSize, &count);
+    atEnd_ = error_ != 0 || count < windowSize;
+    window_.resize(kept + count);
+    bytes_ = std::string_view(window_.data(), window_.size());
 }
 
 KVXMLProlog KVXMLSource::scanProlog()
 {
-    for (;;) {
-        KVXMLProlog prolog = kvScanProlog(bytes_.substr(0, mostOfProlog));
-        if (prolog.kind != KVXMLProlog::Kind::incomplete ||
-            (atEnd_ && bytes_.size() <= mostOfProlog))
+    for (std::size_t scanned = 0;; fillWindow()) {
+        // Twice as much each time, so that looking again costs no more than looking once.
+        if (bytes_.size() < 2 * scanned && !atEnd_)
+            continue;
+        scanned = std::min(bytes_.size(), mostOfProlog);
+        KVXMLProlog const prolog = kvScanProlog(encoding(), bytes_.substr(0, scanned));
+        if (prolog.kind != KVXMLProlog::Kind::incomplete || (atEnd_ && bytes_.size() == scanned))
             return prolog;
-        if (bytes_.size() >= mostOfProlog)
+        if (scanned == mostOfProlog)
             return {KVXMLProlog::Kind::refused, "no root element starts in the first 1048576 bytes",
                     prolog.line};
-        fillWindow(2 * window_.size());
     }
 }
 
-int KVXMLSource::read(char* out, int length) noexcept
+int KVXMLSource::read(char* out, int length)
 {
-    if (bytes_.empty() && !atEnd_)
-        fillWindow(windowSize);
-    if (bytes_.empty())
+    if (given_ == bytes_.size() && !atEnd_)
+        fillWindow();
+    std::string_view const left = bytes_.substr(given_);
+    if (left.empty())
         return error_ != 0 ? -1 : 0;
-    std::size_t count = std::min(bytes_.size(), static_cast<std::size_t>(length));
+    std::size_t count =
+        std::min(left.size(), static_cast<std::size_t>(std::min(length, mostOfPiece)));
     if (lineByLine_)
-        if (std::size_t const newline = bytes_.substr(0, count).find('\n');
+        if (std::size_t const newline = left.substr(0, count).find('\n');
             newline != std::string_view::npos)
             count = newline + 1;
-    std::memcpy(out, bytes_.data(), count);
-    bytes_.remove_prefix(count);
+    std::memcpy(out, left.data(), count);
+    given_ += count;
     return static_cast<int>(count);
+}
+
+std::string_view KVXMLSource::givenFrom(unsigned long long position) noexcept
+{
+    if (position > start_)
+        unneeded_ = std::max(unneeded_, static_cast<std::size_t>(std::min<unsigned long long>(
+                                            position - start_, given_)));
+    return bytes_.substr(unneeded_, given_ - unneeded_);
 }

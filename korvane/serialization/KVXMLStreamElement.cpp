@@ -73,22 +73,20 @@ void replaceEntities(std::string& text, Entity const (&entities)[Size])
 
 KVXMLStreamElement::KVXMLStreamElement(unsigned int elementToken, KVScope* inScope,
                                        KVSerializer* elementHandler)
-    : KVStreamElement(elementToken, inScope, elementHandler)
+    : KVStreamElement(elementToken, inScope, elementHandler),
+      ownStorage_(std::make_unique<Storage>()),
+      storage_(*ownStorage_)
 {}
 
 KVXMLStreamElement::KVXMLStreamElement(unsigned int elementToken, KVScope* inScope,
-                                       KVSerializer* elementHandler, Storage&& storage) noexcept
-    : KVStreamElement(elementToken, inScope, elementHandler), storage_(std::move(storage))
-{}
-
-KVXMLStreamElement::~KVXMLStreamElement() = default;
-
-KVXMLStreamElement::Storage KVXMLStreamElement::releaseStorage() noexcept
+                                       KVSerializer* elementHandler, Storage& storage) noexcept
+    : KVStreamElement(elementToken, inScope, elementHandler), storage_(storage)
 {
     storage_.content.clear();
     storage_.values.clear();
-    return std::move(storage_);
 }
+
+KVXMLStreamElement::~KVXMLStreamElement() = default;
 
 bool KVXMLStreamElement::isXMLStreamElement()
 {
@@ -99,16 +97,11 @@ bool KVXMLStreamElement::isXMLStreamElement()
 
 void KVXMLStreamElement::appendContentWithNewline(char* text, bool newline)
 {
-    if (text)
-        appendContentWithNewline(text, std::strlen(text), newline);
-}
-
-void KVXMLStreamElement::appendContentWithNewline(char const* text, std::size_t length,
-                                                  bool newline)
-{
+    if (!text)
+        return;
     if (hasContent_ && newline)
         storage_.content += '\n';
-    storage_.content.append(text, length);
+    storage_.content += text;
     hasContent_ = true;
     cursor_ = 0;
 }

@@ -20,7 +20,7 @@
 /// gives false, with the output set to what that function gives (for `getAsInt32`, which reads 64
 /// bits, cut to 32). No text at the cursor gives false. `getAsBool` reads a number: "true" is 0.
 /// Attributes are read in the same way, but that an empty one reads as 0.
-class KV_EXPORT KVXMLStreamElement : public KVStreamElement {
+class KV_EXPORT KVXMLStreamElement final : public KVStreamElement {
 public:
     KVXMLStreamElement(unsigned int elementToken, KVScope* inScope, KVSerializer* elementHandler);
     ~KVXMLStreamElement() override;
@@ -51,12 +51,13 @@ public:
     bool getAttributeAsBool(unsigned int attribute, bool* value) const override;
     KVUUID* getAttributeAsUUID(unsigned int attribute) const override;
     bool getAttributeAsVexTime(unsigned int attribute, CMTime* value) const override;
+    /// The line of the element's start tag, in a stream with an observer; else 0.
+    unsigned long line() const noexcept { return line_; }
     /// The value in UTF-8, null when the attribute is absent; valid until another one is added.
     char const* getAttributeAsCString(unsigned int attribute) const noexcept;
 
     /// Copies the text and sets the cursor back to the start. Null adds nothing.
     void appendContentWithNewline(char* text, bool newline) override;
-    void appendContentWithNewline(char const* text, std::size_t length, bool newline);
     bool isXMLStreamElement() override;
 
     /// Adds the value under the token of each row of the element's table that names this attribute
@@ -69,7 +70,6 @@ public:
 private:
     friend class KVXMLReadStream;
 
-    /// Memory that the elements of one depth use one after the other.
     struct Storage {
         std::string content;
         /// The attributes' values, each with its terminator.
@@ -81,9 +81,9 @@ private:
         std::size_t value;
     };
 
+    /// With memory that the elements of one depth use one after the other.
     KVXMLStreamElement(unsigned int elementToken, KVScope* inScope, KVSerializer* elementHandler,
-                       Storage&& storage) noexcept;
-    Storage releaseStorage() noexcept;
+                       Storage& storage) noexcept;
 
     template <class T, class Parse>
     bool readContent(T* value, Parse parse);
@@ -95,8 +95,10 @@ private:
     KVString stringValue_;
     /// Where the next typed getter reads, in the content.
     std::size_t cursor_ = 0;
+    unsigned long line_ = 0;
     bool hasContent_ = false;
-    Storage storage_;
+    std::unique_ptr<Storage> ownStorage_;
+    Storage& storage_;
     Attribute attributes_[7];
     unsigned int attributeCount_ = 0;
     /// From the eighth on.

@@ -5,7 +5,6 @@
 
 #include <algorithm>
 #include <bit>
-#include <numeric>
 
 using kv::uint128;
 
@@ -131,6 +130,20 @@ void multiply(Limbs& x, std::uint64_t factor) noexcept
     }
 }
 
+/// x /= divisor, which is not 0; returns the remainder.
+std::uint64_t divideBy(Limbs& x, std::uint64_t divisor) noexcept
+{
+    std::uint64_t rest = 0;
+    for (std::size_t i = 4; i-- > 0;) {
+        if (x[i] == 0 && rest == 0)
+            continue;
+        uint128 const part = uint128{rest} << 64 | x[i];
+        x[i] = static_cast<std::uint64_t>(part / divisor);
+        rest = static_cast<std::uint64_t>(part % divisor);
+    }
+    return rest;
+}
+
 /// The time of a reduced fraction of magnitudes, both terms halved until they fit a CMTime.
 CMTime timeFromReduced(Limbs numerator, Limbs denominator, bool negative,
                        bool alreadyRounded) noexcept
@@ -166,6 +179,25 @@ CMTime timeFromReduced(Limbs numerator, Limbs denominator, bool negative,
             0};
 }
 
+/// Stein's algorithm, for a < b. The count of zeros is taken of a - b,
+/// whichever is the larger, so that it does not wait for the comparison.
+std::uint64_t gcd(std::uint64_t a, std::uint64_t b) noexcept
+{
+    if (a == 0)
+        return b;
+    int const shift = std::countr_zero(a | b);
+    a >>= std::countr_zero(a);
+    b >>= std::countr_zero(b);
+    while (a != b) {
+        std::uint64_t const difference = a - b;
+        int const zeros = std::countr_zero(difference);
+        std::uint64_t const smaller = a < b ? a : b;
+        a = (a < b ? 0 - difference : difference) >> zeros;
+        b = smaller;
+    }
+    return a << shift;
+}
+
 } // namespace
 
 CMTime kv::timeFromFactors(std::initializer_list<std::int64_t> numerators,
@@ -173,25 +205,20 @@ CMTime kv::timeFromFactors(std::initializer_list<std::int64_t> numerators,
                            bool alreadyRounded) noexcept
 {
     bool negative = false;
-    std::uint64_t left[3];
-    auto* end = left;
-    for (std::int64_t const d : denominators) {
-        negative ^= d < 0;
-        *end++ = magnitude(d);
-    }
     Limbs numerator{1}, denominator{1};
     for (std::int64_t const factor : numerators) {
         negative ^= factor < 0;
-        std::uint64_t n = magnitude(factor);
-        for (std::uint64_t* d = left; d != end; ++d) {
-            std::uint64_t const common = std::gcd(n, *d);
-            n /= common;
-            *d /= common;
-        }
-        multiply(numerator, n);
+        multiply(numerator, magnitude(factor));
     }
-    for (std::uint64_t const* d = left; d != end; ++d)
-        multiply(denominator, *d);
+    for (std::int64_t const factor : denominators) {
+        negative ^= factor < 0;
+        std::uint64_t const divisor = magnitude(factor);
+        Limbs rest = numerator;
+        std::uint64_t const common = gcd(divideBy(rest, divisor), divisor);
+        if (common != 1)
+            divideBy(numerator, common);
+        multiply(denominator, divisor / common);
+    }
     return timeFromReduced(numerator, denominator, negative, alreadyRounded);
 }
 

@@ -12,6 +12,7 @@
 namespace {
 
 constexpr CMTimeScale greatestTimescale = 0x7FFFFFFF;
+constexpr std::uint32_t roundedFlags = kCMTimeFlags_Valid | kCMTimeFlags_HasBeenRounded;
 
 CMTime withoutRoundedBit(CMTime time) noexcept
 {
@@ -62,6 +63,13 @@ bool SimpCMTime(CMTime* time) noexcept
 
 namespace {
 
+/// Numbers on one timescale, which is the usual case.
+bool areAlike(CMTime const& a, CMTime const& b) noexcept
+{
+    return a.timescale == b.timescale && a.timescale != 0 && a.flags == kCMTimeFlags_Valid &&
+           b.flags == kCMTimeFlags_Valid && (a.epoch | b.epoch) == 0;
+}
+
 template <CMTime (*operation)(CMTime, CMTime)>
 CMTime safer(CMTime a, CMTime b) noexcept
 {
@@ -76,11 +84,17 @@ CMTime safer(CMTime a, CMTime b) noexcept
 
 CMTime KV_CMTimeSaferAdd(CMTime a, CMTime b) noexcept
 {
+    CMTimeValue sum;
+    if (areAlike(a, b) && !__builtin_add_overflow(a.value, b.value, &sum))
+        return CMTimeMake(sum, a.timescale);
     return safer<CMTimeAdd>(a, b);
 }
 
 CMTime KV_CMTimeSaferSubtract(CMTime a, CMTime b) noexcept
 {
+    CMTimeValue difference;
+    if (areAlike(a, b) && !__builtin_sub_overflow(a.value, b.value, &difference))
+        return CMTimeMake(difference, a.timescale);
     return safer<CMTimeSubtract>(a, b);
 }
 
@@ -95,20 +109,22 @@ CMTime KV_CMTimeMultiply64Divide64(CMTime time, std::int64_t multiplier,
     if (time.timescale == 0)
         return kCMTimeInvalid;
 
-    CMTime result;
     std::int64_t numerator, denominator;
     if (!__builtin_mul_overflow(time.value, multiplier, &numerator) &&
         !__builtin_mul_overflow(std::int64_t{time.timescale}, divisor, &denominator) &&
         denominator >= 0 && denominator <= greatestTimescale) {
-        result = CMTimeMake(numerator, static_cast<CMTimeScale>(denominator));
-        result.flags |= time.flags & kCMTimeFlags_HasBeenRounded;
-    } else {
-        result = kv::timeFromFactors({time.value, multiplier}, {time.timescale, divisor},
-                                     CMTimeIsRounded(time));
+        // On the timescale of the time this would be numerator / divisor ticks.
+        bool const isRounded = CMTimeIsRounded(time);
+        if (divisor > 1 && !isRounded && numerator % divisor == 0)
+            return CMTimeMake(numerator / divisor, time.timescale);
+        return {numerator, static_cast<CMTimeScale>(denominator),
+                isRounded ? roundedFlags : kCMTimeFlags_Valid, 0};
     }
-
+    CMTime const result = kv::timeFromFactors({time.value, multiplier}, {time.timescale, divisor},
+                                              CMTimeIsRounded(time));
     std::int64_t ticks;
-    if (result.timescale > time.timescale && isExactOn(time.timescale, result, &ticks))
+    if (result.timescale > time.timescale && !CMTimeIsRounded(result) &&
+        isExactOn(time.timescale, result, &ticks))
         return CMTimeMake(ticks, time.timescale);
     return result;
 }

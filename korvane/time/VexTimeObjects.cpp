@@ -184,8 +184,6 @@ KVNSRef<NSObject*> VexTimePairObj::initWithCoder(NSCoder& coder)
 
 // --- VexTimeRangeObj ---
 
-VexTimeRangeOperationCopying::~VexTimeRangeOperationCopying() = default;
-
 NSCodingClass const VexTimeRangeObj::coding = {"VexTimeRangeObj", &VexTimeRangeObj::initWithCoder};
 
 KVNSRef<VexTimeRangeObj*> VexTimeRangeObj::rangeWithRange(CMTimeRange const& range)

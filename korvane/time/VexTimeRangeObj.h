@@ -8,9 +8,8 @@ class VexTimeRangeObj;
 
 /// What the operations on sets of ranges make their results through, so that a range keeps what it
 /// was attached to while it is cut or joined.
-class KV_EXPORT VexTimeRangeOperationCopying {
+class KV_EXPORT VexTimeRangeOperationCopying : public NSObject {
 public:
-    virtual ~VexTimeRangeOperationCopying();
     /// A new object of the receiver's kind with that range and, where it has one, with the
     /// receiver's object.
     virtual KVNSRef<VexTimeRangeObj*> copyWithRange(CMTimeRange const& range) const = 0;
@@ -20,9 +19,7 @@ public:
 /// ranges: see VexTimeRanges.h.
 ///
 /// Treat one as immutable once it is in an array, though there are setters: others may share it.
-class KV_EXPORT VexTimeRangeObj : public NSObject,
-                                  public NSCoding,
-                                  public VexTimeRangeOperationCopying {
+class KV_EXPORT VexTimeRangeObj : public VexTimeRangeOperationCopying, public NSCoding {
 public:
     static NSCodingClass const coding;
 

@@ -4,7 +4,6 @@
 
 #include <algorithm>
 #include <numeric>
-#include <optional>
 #include <unordered_map>
 
 namespace {
@@ -24,16 +23,34 @@ struct Span {
 /// The timescale on which all times are whole.
 class CommonTimescale {
 public:
-    /// False if there is none.
-    bool take(VexTimeRangeArray const& ranges) noexcept
+    /// The ranges of both arrays in its ticks, null ones as empty. False if there is no such
+    /// timescale or one does not fit.
+    bool read(VexTimeRangeArray const& a, VexTimeRangeArray const& b, std::vector<Span>& spans)
     {
-        return std::all_of(ranges.begin(), ranges.end(), [&](VexTimeRangeObj const* range) {
-            return !range || (take(range->start()) && take(range->duration()));
-        });
+        spans.reserve(a.size() + b.size());
+        // Once mostly, and again where a later range has made the timescale longer.
+        do {
+            hasGrown_ = false;
+            spans.clear();
+            if (!append(a, spans) || !append(b, spans))
+                return false;
+        } while (hasGrown_);
+        return true;
     }
 
-    /// One span for each range. False if one does not fit.
-    bool appendSpans(VexTimeRangeArray const& ranges, std::vector<Span>& spans) const
+    /// Whether all times are unrounded numbers that have this timescale already, so that ranges can
+    /// be made from ticks alone.
+    bool isPlain() const noexcept { return isPlain_; }
+    CMTimeRange rangeOf(std::int64_t start, std::int64_t end) const noexcept
+    {
+        auto const timescale = static_cast<CMTimeScale>(timescale_);
+        return {CMTimeMake(start, timescale), CMTimeMake(end - start, timescale)};
+    }
+
+    std::int64_t ticksOf(std::int64_t seconds) const noexcept { return seconds * timescale_; }
+
+private:
+    bool append(VexTimeRangeArray const& ranges, std::vector<Span>& spans)
     {
         for (VexTimeRangeObj const* range : ranges) {
             Span& span = spans.emplace_back();
@@ -51,94 +68,49 @@ public:
         return true;
     }
 
-    std::int64_t ticksOf(std::int64_t seconds) const noexcept { return seconds * timescale_; }
-
-private:
-    static bool isInfinity(CMTime const& time, std::int64_t* ticks) noexcept
+    bool ticksOf(CMTime const& time, std::int64_t* ticks) noexcept
     {
-        *ticks = CMTimeCompare(time, kCMTimeNegativeInfinity) == 0 ? before : forever;
-        return *ticks == before || CMTimeCompare(time, kCMTimePositiveInfinity) == 0;
-    }
-
-    bool take(CMTime const& time) noexcept
-    {
-        std::int64_t ticks;
-        if (!CMTimeIsNumeric(time))
-            return isInfinity(time, &ticks);
-        if (time.timescale < 1 || time.epoch != 0)
+        if (time.flags != kCMTimeFlags_Valid)
+            isPlain_ = false;
+        if (!CMTimeIsNumeric(time)) {
+            *ticks = CMTimeCompare(time, kCMTimeNegativeInfinity) == 0 ? before : forever;
+            return *ticks == before || CMTimeCompare(time, kCMTimePositiveInfinity) == 0;
+        }
+        if (time.timescale != latest_ && !change(time.timescale))
             return false;
-        if (timescale_ % time.timescale != 0)
-            timescale_ = std::lcm(timescale_, std::int64_t{time.timescale});
-        return timescale_ <= INT32_MAX;
-    }
-
-    bool ticksOf(CMTime const& time, std::int64_t* ticks) const noexcept
-    {
-        if (!CMTimeIsNumeric(time))
-            return isInfinity(time, ticks);
-        return !__builtin_mul_overflow(time.value, timescale_ / time.timescale, ticks) &&
+        return time.epoch == 0 && !__builtin_mul_overflow(time.value, factor_, ticks) &&
                *ticks >= -greatestTicks && *ticks <= greatestTicks;
     }
 
+    /// Makes another timescale the one of `latest_` and `factor_`.
+    bool change(CMTimeScale timescale) noexcept
+    {
+        if (timescale < 1)
+            return false;
+        isPlain_ = isPlain_ && latest_ == 0;
+        hasGrown_ = hasGrown_ || (latest_ != 0 && timescale_ % timescale != 0);
+        timescale_ = std::lcm(timescale_, std::int64_t{timescale});
+        latest_ = timescale;
+        factor_ = timescale_ / timescale;
+        return timescale_ <= INT32_MAX;
+    }
+
     std::int64_t timescale_ = 1;
+    bool hasGrown_ = false, isPlain_ = true;
+    CMTimeScale latest_ = 0; // neighbours mostly have one timescale
+    std::int64_t factor_ = 0;
 };
+
+using Index = std::uint32_t;
+constexpr std::size_t greatestCount = UINT32_MAX - 2;
 
 // --- Add ---
 
-/// Ranges that have been joined, as trees whose root is the member with the lowest number.
-class Joined {
-public:
-    explicit Joined(std::vector<Span> const& spans) : spans_(spans), members_(spans.size())
-    {
-        for (std::size_t id = 0; id < members_.size(); ++id)
-            members_[id] = {id, id, id};
-    }
-
-    void join(std::size_t a, std::size_t b) noexcept
-    {
-        a = rootOf(a);
-        b = rootOf(b);
-        if (a == b)
-            return;
-        Member &root = members_[std::min(a, b)], &child = members_[std::max(a, b)];
-        child.parent = root.parent;
-        root.isParent = true;
-        if (spans_[child.first].start < spans_[root.first].start)
-            root.first = child.first;
-        if (spans_[child.last].end > spans_[root.last].end)
-            root.last = child.last;
-    }
-
-    bool isRoot(std::size_t id) const noexcept { return members_[id].parent == id; }
-    bool isAlone(std::size_t root) const noexcept { return !members_[root].isParent; }
-    /// The members of a root's tree that start first and end last.
-    std::size_t first(std::size_t root) const noexcept { return members_[root].first; }
-    std::size_t last(std::size_t root) const noexcept { return members_[root].last; }
-
-private:
-    struct Member {
-        std::size_t parent, first, last;
-        bool isParent = false;
-    };
-
-    std::size_t rootOf(std::size_t id) noexcept
-    {
-        while (!isRoot(id)) {
-            members_[id].parent = members_[members_[id].parent].parent;
-            id = members_[id].parent;
-        }
-        return id;
-    }
-
-    std::vector<Span> const& spans_;
-    std::vector<Member> members_;
-};
-
-/// What the sweep comes to next.
+/// What the sweep comes to next: a range, by its number.
 struct Stop {
-    std::size_t group; // ranges of different groups do not meet
     std::int64_t start, end;
-    std::size_t id;
+    Index group; // ranges of different groups do not meet
+    Index id;
 
     friend bool operator<(Stop const& a, Stop const& b) noexcept
     {
@@ -146,46 +118,93 @@ struct Stop {
     }
 };
 
+/// Ranges that have been joined, as trees of stops whose root is the one that starts first.
+class Joined {
+public:
+    explicit Joined(std::vector<Stop> const& stops) : stops_(stops), nodes_(stops.size())
+    {
+        for (Index i = 0; i < nodes_.size(); ++i)
+            nodes_[i] = {i, i, stops[i].id, 1};
+    }
+
+    void join(Index a, Index b) noexcept
+    {
+        a = rootOf(a);
+        b = rootOf(b);
+        if (a == b)
+            return;
+        Node &root = nodes_[std::min(a, b)], &child = nodes_[std::max(a, b)];
+        child.parent = root.parent;
+        if (stops_[child.last].end > stops_[root.last].end)
+            root.last = child.last;
+        root.leader = std::min(root.leader, child.leader);
+        root.size += child.size;
+    }
+
+    Index rootOf(Index stop) noexcept
+    {
+        while (nodes_[stop].parent != stop) {
+            nodes_[stop].parent = nodes_[nodes_[stop].parent].parent;
+            stop = nodes_[stop].parent;
+        }
+        return stop;
+    }
+    bool isAlone(Index root) const noexcept { return nodes_[root].size == 1; }
+    /// The stop that ends last.
+    Index last(Index root) const noexcept { return nodes_[root].last; }
+    /// The lowest number of a range.
+    Index leader(Index root) const noexcept { return nodes_[root].leader; }
+
+private:
+    struct Node {
+        Index parent, last, leader, size;
+    };
+
+    std::vector<Stop> const& stops_;
+    std::vector<Node> nodes_;
+};
+
 /// Joins each range that is added to all that it overlaps. Ranges that are there already, those
 /// with numbers below `addedFrom`, are not joined to each other by themselves.
 void joinOverlapping(std::vector<Stop> const& stops, std::size_t addedFrom, Joined& joined)
 {
     struct Open {
-        std::size_t id;
+        Index stop;
         std::int64_t end;
     };
     std::vector<Open> there; // those that are there and have begun
     Open added{0, before};   // of those that are added and have begun, the end of the last
-    std::size_t group = 0;
-    for (Stop const& stop : stops) {
+    Index group = 0;
+    for (Index i = 0; i < stops.size(); ++i) {
+        Stop const& stop = stops[i];
         if (stop.group != group) {
             there.clear();
             added.end = before;
             group = stop.group;
         }
         if (stop.start < added.end)
-            joined.join(stop.id, added.id);
+            joined.join(i, added.stop);
         if (stop.id < addedFrom) {
-            there.push_back({stop.id, stop.end});
+            there.push_back({i, stop.end});
             continue;
         }
-        Open reached{stop.id, before}; // what it overlaps is one range from here on
+        Open reached{i, before}; // what it overlaps is one range from here on
         for (Open const& open : there)
             if (stop.start < open.end) {
-                joined.join(stop.id, open.id);
+                joined.join(i, open.stop);
                 reached.end = std::max(reached.end, open.end);
             }
         there.clear();
         if (stop.start < reached.end)
             there.push_back(reached);
-        added = {stop.id, std::max(added.end, stop.end)};
+        added = {i, std::max(added.end, stop.end)};
     }
 }
 
 /// Numbers objects, equal ones alike.
 class Groups {
 public:
-    std::size_t of(NSObject const* object)
+    Index of(NSObject const* object)
     {
         auto& same = byHash_[CFHash(object)];
         for (auto const& [known, group] : same)
@@ -196,8 +215,8 @@ public:
     }
 
 private:
-    std::unordered_map<std::size_t, std::vector<std::pair<NSObject const*, std::size_t>>> byHash_;
-    std::size_t count_ = 0;
+    std::unordered_map<std::size_t, std::vector<std::pair<NSObject const*, Index>>> byHash_;
+    Index count_ = 0;
 };
 
 } // namespace
@@ -208,43 +227,66 @@ NSObject const* kv::objectOf(VexTimeRangeObj const* range) noexcept
     return owner ? owner->object() : nullptr;
 }
 
-bool kv::addBySweep(VexTimeRangeArray& array, VexTimeRangeArray const& ranges,
-                    bool keepObjectsApart)
+std::optional<VexTimeRangeArray> kv::addBySweep(VexTimeRangeArray const& array,
+                                                VexTimeRangeArray const& added,
+                                                bool keepObjectsApart)
 {
+    std::size_t const count = array.size() + added.size();
     CommonTimescale scale;
     std::vector<Span> spans;
-    spans.reserve(array.size() + ranges.size());
-    if (!scale.take(array) || !scale.take(ranges) || !scale.appendSpans(array, spans) ||
-        !scale.appendSpans(ranges, spans))
-        return false;
+    if (count > greatestCount || !scale.read(array, added, spans))
+        return std::nullopt;
 
-    auto const rangeOf = [&](std::size_t id) -> KVNSRef<VexTimeRangeObj*> const& {
-        return id < array.size() ? array[id] : ranges[id - array.size()];
+    // Ranges have numbers, those that are added behind the others.
+    auto const rangeAt = [&](std::size_t id) -> KVNSRef<VexTimeRangeObj*> const& {
+        return id < array.size() ? array[id] : added[id - array.size()];
     };
-    Groups groups;
+    // What becomes of a range: it stays, goes, or is replaced by the union of that number.
+    constexpr Index stays = UINT32_MAX, goes = stays - 1;
+    std::vector<Index> fates(count, stays);
     std::vector<Stop> stops;
-    stops.reserve(spans.size());
-    for (std::size_t id = 0; id < spans.size(); ++id)
-        if (spans[id].meetsOthers())
-            stops.push_back({keepObjectsApart ? groups.of(objectOf(rangeOf(id))) : 0,
-                             spans[id].start, spans[id].end, id});
+    stops.reserve(count);
+    Groups groups;
+    for (std::size_t id = 0; id < count; ++id) {
+        Span const& span = spans[id];
+        if (span.meetsOthers())
+            stops.push_back({span.start, span.end,
+                             keepObjectsApart ? groups.of(objectOf(rangeAt(id))) : 0,
+                             static_cast<Index>(id)});
+        else if (span.isEmpty && id >= array.size())
+            fates[id] = goes;
+    }
     std::sort(stops.begin(), stops.end());
 
-    Joined joined(spans);
+    Joined joined(stops);
     joinOverlapping(stops, array.size(), joined);
+    std::vector<CMTimeRange> unions;
+    for (Index i = 0; i < stops.size(); ++i) {
+        Index const root = joined.rootOf(i), id = stops[i].id;
+        if (joined.isAlone(root))
+            continue;
+        if (id == joined.leader(root)) {
+            fates[id] = static_cast<Index>(unions.size());
+            Stop const &first = stops[root], &last = stops[joined.last(root)];
+            unions.push_back(scale.isPlain() ? scale.rangeOf(first.start, last.end)
+                                             : KV_CMTimeRangeUnion(rangeAt(first.id)->range(),
+                                                                   rangeAt(last.id)->range()));
+        } else {
+            fates[id] = goes;
+        }
+    }
 
     VexTimeRangeArray result;
-    for (std::size_t id = 0; id < spans.size(); ++id) {
-        if (!joined.isRoot(id) || (id >= array.size() && spans[id].isEmpty))
+    result.reserve(count - static_cast<std::size_t>(std::count(fates.begin(), fates.end(), goes)));
+    for (std::size_t id = 0; id < count; ++id) {
+        if (fates[id] == goes)
             continue;
-        if (joined.isAlone(id))
-            result.push_back(rangeOf(id));
+        if (fates[id] != stays)
+            result.push_back(rangeAt(id)->copyWithRange(unions[fates[id]]));
         else
-            result.push_back(rangeOf(id)->copyWithRange(KV_CMTimeRangeUnion(
-                rangeOf(joined.first(id))->range(), rangeOf(joined.last(id))->range())));
+            result.push_back(rangeAt(id));
     }
-    array = std::move(result);
-    return true;
+    return result;
 }
 
 // --- Subtract ---
@@ -255,17 +297,14 @@ namespace {
 /// ends it.
 struct Hole {
     std::int64_t start, end;
-    std::size_t opens, closes;
+    Index opens, closes;
 };
 
-std::vector<Hole> holesOf(std::vector<Span> const& spans)
+std::vector<Hole> joinedHoles(std::vector<Hole> each)
 {
-    std::vector<Hole> each, holes;
-    for (std::size_t i = 0; i < spans.size(); ++i)
-        if (spans[i].meetsOthers())
-            each.push_back({spans[i].start, spans[i].end, i, i});
     std::sort(each.begin(), each.end(),
               [](Hole const& a, Hole const& b) { return a.start < b.start; });
+    std::vector<Hole> holes;
     for (Hole const& next : each) {
         if (holes.empty() || holes.back().end < next.start) {
             holes.push_back(next);
@@ -279,54 +318,62 @@ std::vector<Hole> holesOf(std::vector<Span> const& spans)
 
 } // namespace
 
-bool kv::subtractBySweep(VexTimeRangeArray& array, VexTimeRangeArray const& ranges)
+std::optional<VexTimeRangeArray> kv::subtractBySweep(VexTimeRangeArray const& array,
+                                                     VexTimeRangeArray const& subtracted)
 {
     CommonTimescale scale;
-    std::vector<Span> spans, cuts;
-    if (!scale.take(array) || !scale.take(ranges) || !scale.appendSpans(array, spans) ||
-        !scale.appendSpans(ranges, cuts))
-        return false;
+    std::vector<Span> spans;
+    if (subtracted.size() > greatestCount || !scale.read(array, subtracted, spans))
+        return std::nullopt;
 
-    std::vector<Hole> const holes = holesOf(cuts);
+    std::vector<Hole> each; // in the order in which they are given
+    each.reserve(subtracted.size());
+    for (Index i = 0; i < subtracted.size(); ++i)
+        if (Span const& span = spans[array.size() + i]; span.meetsOthers())
+            each.push_back({span.start, span.end, i, i});
+    std::vector<Hole> const holes = joinedHoles(each);
+    // Searched for every element: close together, so that they stay near the processor.
+    std::vector<std::int64_t> ends(holes.size());
+    std::transform(holes.begin(), holes.end(), ends.begin(), [](Hole const& h) { return h.end; });
+
     VexTimeRangeArray result;
     result.reserve(array.size());
     for (std::size_t i = 0; i < array.size(); ++i) {
-        auto [start, end, isEmpty] = spans[i];
-        auto hole = std::upper_bound(holes.begin(), holes.end(), start,
-                                     [](std::int64_t at, Hole const& h) { return at < h.end; });
+        std::int64_t start = spans[i].start, end = spans[i].end;
+        auto hole =
+            holes.begin() + (std::upper_bound(ends.begin(), ends.end(), start) - ends.begin());
         if (!spans[i].meetsOthers() || hole == holes.end() || hole->start >= end) {
             result.push_back(array[i]);
             continue;
         }
 
-        CMTime pieceStart = array[i]->start();
+        VexTimeRangeObj const* const range = array[i];
+        CMTime pieceStart = range->start();
         if (start == before) {
-            // The first range that cuts into an open start leaves one year of it.
-            auto const first = std::find_if(cuts.begin(), cuts.end(), [&](Span const& cut) {
-                return cut.meetsOthers() && cut.start < end;
-            });
+            // The first that cuts into an open start leaves one year of it.
+            auto const first = std::find_if(each.begin(), each.end(),
+                                            [&](Hole const& cut) { return cut.start < end; });
             if (first->start != before) {
                 start = first->start - scale.ticksOf(kKV_CMTimeOneYear.value);
-                pieceStart =
-                    CMTimeSubtract(ranges[static_cast<std::size_t>(first - cuts.begin())]->start(),
-                                   kKV_CMTimeOneYear);
+                pieceStart = CMTimeSubtract(subtracted[first->opens]->start(), kKV_CMTimeOneYear);
                 while (hole->end <= start)
                     ++hole;
             }
         }
-        auto const emit = [&](CMTime const& pieceEnd) {
-            result.push_back(
-                array[i]->copyWithRange(KV_CMTimeRangeMakeWithStartEnd(pieceStart, pieceEnd)));
+        auto const emit = [&](std::int64_t to, auto pieceEnd) {
+            result.push_back(range->copyWithRange(
+                scale.isPlain() ? scale.rangeOf(start, to)
+                                : KV_CMTimeRangeMakeWithStartEnd(pieceStart, pieceEnd())));
         };
         for (; hole != holes.end() && hole->start < end; ++hole) {
             if (hole->start > start)
-                emit(ranges[hole->opens]->start());
-            pieceStart = ranges[hole->closes]->end();
+                emit(hole->start, [&] { return subtracted[hole->opens]->start(); });
             start = hole->end;
+            if (!scale.isPlain())
+                pieceStart = subtracted[hole->closes]->end();
         }
         if (start < end)
-            emit(array[i]->end());
+            emit(end, [&] { return range->end(); });
     }
-    array = std::move(result);
-    return true;
+    return result;
 }

@@ -2,16 +2,20 @@
 
 #include <korvane/time/VexTimeRanges.h>
 
+#include <optional>
+
 namespace kv {
 
 /// The object that an element belongs to; null for a plain range.
 NSObject const* objectOf(VexTimeRangeObj const* range) noexcept;
 
 // Adding and subtracting whole sets in one pass over their sorted ends, with the results of doing
-// it range by range. That needs exact arithmetic: false, and nothing changed, unless all times are
-// infinite or can be written as whole ticks of one timescale.
+// it range by range. That needs exact arithmetic: nothing comes back unless all times are infinite
+// or can be written as whole ticks of one timescale.
 
-bool addBySweep(VexTimeRangeArray& array, VexTimeRangeArray const& ranges, bool keepObjectsApart);
-bool subtractBySweep(VexTimeRangeArray& array, VexTimeRangeArray const& ranges);
+std::optional<VexTimeRangeArray> addBySweep(VexTimeRangeArray const& array,
+                                            VexTimeRangeArray const& added, bool keepObjectsApart);
+std::optional<VexTimeRangeArray> subtractBySweep(VexTimeRangeArray const& array,
+                                                 VexTimeRangeArray const& subtracted);
 
 } // namespace kv

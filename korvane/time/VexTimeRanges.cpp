@@ -63,7 +63,8 @@ bool appendPieces(VexTimeRangeObj const* object, std::span<Extent const> ranges,
     return cut;
 }
 
-void addOneByOne(VexTimeRangeArray& array, VexTimeRangeArray const& ranges, bool keepObjectsApart)
+VexTimeRangeArray addOneByOne(VexTimeRangeArray array, VexTimeRangeArray const& ranges,
+                              bool keepObjectsApart)
 {
     std::vector<Extent> extents = extentsOf(array);
     for (KVNSRef<VexTimeRangeObj*> const& range : ranges) {
@@ -96,9 +97,10 @@ void addOneByOne(VexTimeRangeArray& array, VexTimeRangeArray const& ranges, bool
         array[first] = array[first]->copyWithRange(joined);
         extents[first] = Extent(joined);
     }
+    return array;
 }
 
-void subtractOneByOne(VexTimeRangeArray& array, VexTimeRangeArray const& ranges)
+VexTimeRangeArray subtractOneByOne(VexTimeRangeArray array, VexTimeRangeArray const& ranges)
 {
     for (VexTimeRangeObj const* range : ranges) {
         Extent const hole(range);
@@ -111,14 +113,14 @@ void subtractOneByOne(VexTimeRangeArray& array, VexTimeRangeArray const& ranges)
         }
         array = std::move(result);
     }
+    return array;
 }
 
-void addUnsorted(VexTimeRangeArray& array, VexTimeRangeArray const& ranges, bool keepObjectsApart)
+VexTimeRangeArray added(VexTimeRangeArray const& array, VexTimeRangeArray const& ranges,
+                        bool keepObjectsApart)
 {
-    if (&array == &ranges)
-        return addUnsorted(array, VexTimeRangeArray(ranges), keepObjectsApart);
-    if (!kv::addBySweep(array, ranges, keepObjectsApart))
-        addOneByOne(array, ranges, keepObjectsApart);
+    auto swept = kv::addBySweep(array, ranges, keepObjectsApart);
+    return swept ? std::move(*swept) : addOneByOne(array, ranges, keepObjectsApart);
 }
 
 } // namespace
@@ -173,28 +175,24 @@ VexTimeRangeArray VexTimeRangesAddSortedRanges(VexTimeRangeArray const& array,
 void VexTimeMutableRangesAddUnsortedRanges(VexTimeRangeArray& array,
                                            VexTimeRangeArray const& ranges)
 {
-    addUnsorted(array, ranges, false);
+    array = added(array, ranges, false);
 }
 
 VexTimeRangeArray VexTimeRangesAddUnsortedRanges(VexTimeRangeArray const& array,
                                                  VexTimeRangeArray const& ranges)
 {
-    VexTimeRangeArray copy = array;
-    addUnsorted(copy, ranges, false);
-    return copy;
+    return added(array, ranges, false);
 }
 
 void VexTimeMutableRangeAndObjectsAddUnsortedRangeAndObjects(VexTimeRangeArray& array,
                                                              VexTimeRangeArray const& ranges)
 {
-    addUnsorted(array, ranges, true);
+    array = added(array, ranges, true);
 }
 
 VexTimeRangeArray VexTimeRangesCollapseRangeAndObjects(VexTimeRangeArray const& array)
 {
-    VexTimeRangeArray collapsed;
-    addUnsorted(collapsed, array, true);
-    return collapsed;
+    return added({}, array, true);
 }
 
 // --- Subtract and mask ---
@@ -211,18 +209,14 @@ VexTimeRangeArray VexTimeRangeObjSubtractSortedRanges(VexTimeRangeObj const* ran
 void VexTimeMutableRangesSubtractUnsortedRanges(VexTimeRangeArray& array,
                                                 VexTimeRangeArray const& ranges)
 {
-    if (&array == &ranges)
-        return VexTimeMutableRangesSubtractUnsortedRanges(array, VexTimeRangeArray(ranges));
-    if (!kv::subtractBySweep(array, ranges))
-        subtractOneByOne(array, ranges);
+    array = VexTimeRangesSubtractUnsortedRanges(array, ranges);
 }
 
 VexTimeRangeArray VexTimeRangesSubtractUnsortedRanges(VexTimeRangeArray const& array,
                                                       VexTimeRangeArray const& ranges)
 {
-    VexTimeRangeArray copy = array;
-    VexTimeMutableRangesSubtractUnsortedRanges(copy, ranges);
-    return copy;
+    auto swept = kv::subtractBySweep(array, ranges);
+    return swept ? std::move(*swept) : subtractOneByOne(array, ranges);
 }
 
 namespace {

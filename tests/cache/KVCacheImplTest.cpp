@@ -280,6 +280,32 @@ TEST(KVCacheImpl, AFailedAllocationChangesNothing)
     }
 }
 
+/// Counts how often it is held, and fails if it is taken twice.
+struct CountingLock {
+    static inline int taken = 0;
+    static inline bool held = false;
+    void lock()
+    {
+        EXPECT_FALSE(held);
+        held = true;
+        ++taken;
+    }
+    void unlock() { held = false; }
+};
+
+TEST(KVCacheImpl, EachOperationHoldsTheLockOnce)
+{
+    KVCacheImpl<int, int, CountingLock> cache(1);
+    bool found = false;
+    cache.addValue(1, 1, 0);
+    cache.addValue(2, 1, 0); // evicts
+    cache.findValue(1, found);
+    cache.findValue(2, found);
+    cache.evictIfNecessary();
+    EXPECT_EQ(CountingLock::taken, 5);
+    EXPECT_FALSE(CountingLock::held);
+}
+
 TEST(KVCache, KeepsItsEntriesAlive)
 {
     auto const value = std::make_shared<int>(1);

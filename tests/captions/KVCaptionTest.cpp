@@ -243,6 +243,7 @@ TEST(KVCaption, CopiesAreOfTheSameClassAndMutableCopiesOfItsPartner)
         };
         KVNSRef<KVCaption*> const copy = caption->copy();
         EXPECT_TRUE(copy->isEqual(caption));
+        EXPECT_EQ(copy->hash(), caption->hash());
         EXPECT_EQ(isMutable(copy), isMutable(caption));
         KVNSRef<KVCaption*> const other = caption->mutableCopy();
         EXPECT_TRUE(other->isEqual(caption));

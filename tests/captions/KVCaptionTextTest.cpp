@@ -175,17 +175,20 @@ TEST(KVGroupOverlappingCaptions, JoinsWhatStartsBeforeTheGroupsEnd)
 TEST(KVGroupOverlappingCaptions, TakesTimeInProportionWhateverTheOverlaps)
 {
     auto const text = KVMakeRef<NSAttributedString>("one text for all");
-    // All apart, all in one group, all equal and apart from the rest.
-    using Make = CMTimeRange (*)(int);
+    // All apart, all in one group, all equal, all alike but for the cell.
+    using Make = KVNSRef<KVCaption*> (*)(NSAttributedString const*, int);
     Make const makes[] = {
-        [](int i) { return rangeOf(i, i + 1); },
-        [](int i) { return rangeOf(i, 1'000'000); },
-        [](int) { return rangeOf(5, 5); },
+        [](auto const* t, int i) { return KVMakeRef<KVCaption>(t, rangeOf(i, i + 1)); },
+        [](auto const* t, int i) { return KVMakeRef<KVCaption>(t, rangeOf(i, 1'000'000)); },
+        [](auto const* t, int) { return KVMakeRef<KVCaption>(t, rangeOf(5, 5)); },
+        [](auto const* t, int i) -> KVNSRef<KVCaption*> {
+            return KVMakeRef<KVCaptionCEA608>(t, rangeOf(5, 5), i, 0, 1, 0, 0);
+        },
     };
     for (Make make : makes) {
         KVCaptionArray captions;
         for (int i = 0; i < 50'000; ++i)
-            captions.push_back(KVMakeRef<KVCaption>(text, make(i)));
+            captions.push_back(make(text, i));
         auto const start = std::chrono::steady_clock::now();
         EXPECT_FALSE(KVGroupOverlappingCaptions(captions, false).empty());
         // A pass over the rest for each caption would take minutes.

@@ -219,7 +219,7 @@ TEST(KVAtomBoxFile, ATreeMayBeAsDeepAsTheFileAllows)
     Folder const folder;
     ASSERT_EQ(file->openOutputFile(KVURL(folder.path("out").c_str()).cf_url()), 0);
     EXPECT_EQ(file->writeAtomBoxFileWithUpdates(), 0);
-    EXPECT_TRUE(readFile(folder.path("out")) == bytes);
+    EXPECT_TRUE(fileBytes(folder.path("out")) == bytes);
 }
 
 TEST(KVAtomBoxFile, PayloadsLieInTheirParentAndInTheFile)
@@ -291,7 +291,7 @@ TEST(KVAtomBoxFile, TheFileTypeIsTheFirstValidBrand)
 
 TEST(KVAtomBoxFile, TracksAreReadDownToTheirTables)
 {
-    Opened file(readFile(sampleMovie("colr.mp4")));
+    Opened file(fileBytes(sampleMovie("colr.mp4")));
     ASSERT_EQ(file->readAllTrackMediaAtomBoxes(), 0);
     EXPECT_EQ(show(*file), "0(ftyp moov(mvhd trak(tkhd edts mdia(mdhd hdlr minf(vmhd dinf stbl("
                            "stsd stts stss ctts stsc stsz stco)))) udta) free mdat)");

@@ -40,7 +40,7 @@ struct Rewrite {
         EXPECT_EQ(file.writeAtomBoxFileWithUpdates(), expected);
         EXPECT_EQ(file.getWriteDoneResult(), expected == 0 ? 1 : expected);
         file.closeOutputFile();
-        return readFile(folder.path(name));
+        return fileBytes(folder.path(name));
     }
 };
 
@@ -69,7 +69,7 @@ TEST(KVAtomBoxFileWrite, WhatIsNotTouchedIsCopiedByteForByte)
     for (std::string const& name : plainSamples()) {
         Rewrite rewrite;
         rewrite.openAndRead(sampleMovie(name));
-        EXPECT_TRUE(rewrite.write() == readFile(sampleMovie(name))) << name;
+        EXPECT_TRUE(rewrite.write() == fileBytes(sampleMovie(name))) << name;
         EXPECT_EQ(rewrite.file.getWritePercentDone() > 90, true) << name;
     }
     Folder const folder;
@@ -78,13 +78,13 @@ TEST(KVAtomBoxFileWrite, WhatIsNotTouchedIsCopiedByteForByte)
     ASSERT_EQ(unread.openInputFile(url(folder.write("in", junk)).cf_url()), 0);
     ASSERT_EQ(unread.openOutputFile(url(folder.path("out")).cf_url()), 0);
     EXPECT_EQ(unread.writeAtomBoxFileWithUpdates(), 0);
-    EXPECT_EQ(readFile(folder.path("out")), junk) << "a tree that was not read is one piece";
+    EXPECT_EQ(fileBytes(folder.path("out")), junk) << "a tree that was not read is one piece";
 }
 
 TEST(KVAtomBoxFileWrite, SamplesStayTheSameWhateverStandsInFrontOfThem)
 {
     for (std::string const& name : plainSamples()) {
-        std::string const original = readFile(sampleMovie(name));
+        std::string const original = fileBytes(sampleMovie(name));
         std::vector<std::string> const samples = samplesOf(original);
         ASSERT_GE(samples.size(), 24u);
         for (std::size_t const by : {8u, 9u, 5000u}) {
@@ -109,14 +109,14 @@ TEST(KVAtomBoxFileWrite, SamplesStayTheSameWhateverStandsInFrontOfThem)
             moov.updateSize();
             moov.updateParentSizes();
             EXPECT_TRUE(samplesOf(rewrite.write()) == samples) << name << by;
-            EXPECT_LT(readFile(rewrite.folder.path("out")).size(), original.size());
+            EXPECT_LT(fileBytes(rewrite.folder.path("out")).size(), original.size());
         }
     }
 }
 
 TEST(KVAtomBoxFileWrite, ASecondWriteStartsFromTheTablesOfTheInput)
 {
-    std::string const original = readFile(sampleMovie("head-moov.mp4"));
+    std::string const original = fileBytes(sampleMovie("head-moov.mp4"));
     Rewrite rewrite;
     rewrite.openAndRead(sampleMovie("head-moov.mp4"));
     grow(rewrite, 100);
@@ -219,13 +219,13 @@ TEST(KVAtomBoxFileWrite, NewTopLevelAtomsCountAsInFrontWhereverTheyStand)
 
 TEST(KVAtomBoxFileWrite, ATableThatCanNotBeReadStopsTheWriteBeforeItStarts)
 {
-    Rewrite rewrite(readFile(sampleMovie("head-moov.mp4")));
+    Rewrite rewrite(fileBytes(sampleMovie("head-moov.mp4")));
     grow(rewrite, 16);
     rewrite.find("stco").setOffset(1'000'000);
     ASSERT_EQ(rewrite.file.openOutputFile(url(rewrite.folder.path("out")).cf_url()), 0);
     EXPECT_EQ(rewrite.file.writeAtomBoxFileWithUpdates(), -1);
     EXPECT_EQ(rewrite.file.getWriteDoneResult(), 0) << "no state changes";
-    EXPECT_EQ(readFile(rewrite.folder.path("out")), "");
+    EXPECT_EQ(fileBytes(rewrite.folder.path("out")), "");
 }
 
 // --- Headers ---
@@ -303,8 +303,8 @@ TEST(KVAtomBoxFileWrite, WhatReadingDropsIsMeasuredBeforeTheWrite)
         Rewrite rewrite(front + atom("mdat", "data"));
         EXPECT_EQ(toHex(rewrite.write()), toHex(expected + atom("mdat", "data"))) << row.name;
     }
-    Rewrite trailing(readFile(sampleMovie("tail-moov.mp4")) + "trailing");
-    EXPECT_TRUE(trailing.write() == readFile(sampleMovie("tail-moov.mp4"))) << "junk is dropped";
+    Rewrite trailing(fileBytes(sampleMovie("tail-moov.mp4")) + "trailing");
+    EXPECT_TRUE(trailing.write() == fileBytes(sampleMovie("tail-moov.mp4"))) << "junk is dropped";
 }
 
 TEST(KVAtomBoxFileWrite, ATableWithALongHeaderIsMeasuredAgain)
@@ -375,7 +375,7 @@ TEST(KVAtomBoxFileWrite, HolesAtTheEndOfTheFileAreKept)
     Rewrite rewrite;
     rewrite.openAndRead(path);
     rewrite.folder.write("out", std::string(5 << 20, 'x')); // what was there is gone
-    EXPECT_TRUE(rewrite.write() == readFile(path));
+    EXPECT_TRUE(rewrite.write() == fileBytes(path));
 }
 
 // --- Failures ---
@@ -396,7 +396,7 @@ TEST(KVAtomBoxFileWrite, OutputsThatCanNotBeOpenedGiveTheStatedCodes)
         EXPECT_EQ(rewrite.file.openOutputFile(url(folder.path(row.name)).cf_url()), row.code)
             << row.name;
         EXPECT_EQ(rewrite.file.writeAtomBoxFileWithUpdates(), -1) << "no output is open";
-        EXPECT_EQ(readFile(folder.path("in")), atom("free", "1234"))
+        EXPECT_EQ(fileBytes(folder.path("in")), atom("free", "1234"))
             << "the input is never touched";
     }
     {
@@ -424,7 +424,7 @@ TEST(KVAtomBoxFileWrite, AFullDiskIsNoSuccess)
 
 TEST(KVAtomBoxFileWrite, AnInputThatShrankGivesAFailure)
 {
-    Rewrite rewrite(readFile(sampleMovie("head-moov.mp4")));
+    Rewrite rewrite(fileBytes(sampleMovie("head-moov.mp4")));
     ASSERT_EQ(truncate(rewrite.folder.path("in").c_str(), 5000), 0);
     rewrite.write(-1);
 }

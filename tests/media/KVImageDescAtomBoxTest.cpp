@@ -114,7 +114,7 @@ TEST(KVImageDescAtomBox, SampleMoviesComeOutAsTheyWere)
 {
     for (std::string const& name : plainSamples()) {
         std::string const payload(
-            findPayload(readFile(sampleMovie(name)), "moov/trak/mdia/minf/stbl/stsd"));
+            findPayload(fileBytes(sampleMovie(name)), "moov/trak/mdia/minf/stbl/stsd"));
         KVImageDescAtomBox descriptions = parse(payload);
         ASSERT_EQ(descriptions.getImageDescCount(), 1) << name;
         EXPECT_TRUE(full(descriptions) == payload) << name;

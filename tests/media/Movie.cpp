@@ -167,7 +167,7 @@ std::vector<std::string> samplesOf(std::string const& movie)
 
 // --- Files ---
 
-std::string readFile(std::string const& path)
+std::string fileBytes(std::string const& path)
 {
     std::ostringstream bytes;
     bytes << std::ifstream(path, std::ios::binary).rdbuf();
@@ -187,9 +187,11 @@ std::vector<std::string> const& plainSamples()
     return names;
 }
 
-Folder::Folder()
+Folder::Folder() : Folder(testing::TempDir()) {}
+
+Folder::Folder(std::string const& above)
 {
-    std::string path = testing::TempDir() + "korvane-media-XXXXXX";
+    std::string path = above + "/korvane-media-XXXXXX";
     if (!mkdtemp(path.data()))
         throw std::runtime_error("no folder for the test");
     path_ = path;

@@ -66,7 +66,7 @@ std::vector<std::string> samplesOf(std::string const& movie);
 
 // --- Files ---
 
-std::string readFile(std::string const& path);
+std::string fileBytes(std::string const& path);
 /// One of tests/data/media.
 std::string sampleMovie(std::string const& name);
 /// The names of the sample movies that are not fragmented.
@@ -76,6 +76,8 @@ std::vector<std::string> const& plainSamples();
 class Folder {
 public:
     Folder();
+    /// Below another folder than that for temporary files.
+    explicit Folder(std::string const& above);
     ~Folder();
     Folder(Folder const&) = delete;
     Folder& operator=(Folder const&) = delete;

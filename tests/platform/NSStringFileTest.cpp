@@ -88,6 +88,7 @@ TEST(NSStringFile, FilesComeAndGoAndTellWhyNot)
         {KVURL(folder.c_str()), EISDIR, EISDIR},
         {KVURL(), ENOENT, ENOENT},
         {KVURL(KVString("file:///dev/null%00")), ENOENT, ENOENT},
+        {KVURL(KVString("http://host/dev/null")), ENOENT, ENOENT},
     };
     for (Row const& row : rows) {
         EXPECT_TRUE(NSStringWithContentsOfURL(row.url, nullptr, &error).isNull());

@@ -2,7 +2,7 @@
 
 #include <support/Allocations.h>
 
-#include <chrono>
+#include <ctime>
 #include <functional>
 #include <limits>
 #include <map>
@@ -473,6 +473,30 @@ TEST(KVBinaryXMLReadStream, ReadsFromFiles)
     EXPECT_EQ(file.getPos(), bytes.size());
 }
 
+TEST(KVBinaryXMLReadStream, ReadsAcrossTheEndsOfItsWindow)
+{
+    std::string const leaf = element("\3", "\2\2\x0E\1\2\3\4\5\6\7\4\x08\7\x2B\3abc"s);
+    for (std::size_t shift = 0; shift < leaf.size(); ++shift) {
+        std::string const first = element("\x55", std::string(shift, '\xFF'));
+        std::string bytes = header + first;
+        while (bytes.size() < 140000)
+            bytes += leaf;
+        Recorder recorder;
+        long wrong = 0;
+        recorder.onElement = [&](auto&, KVStreamElement& e) {
+            unsigned long long number = 0;
+            int small = 0;
+            e.getAttributeAsUInt64(2, &number);
+            e.getAttributeAsInt32(4, &small);
+            wrong += number != 0x07060504030201 || small != 7;
+        };
+        recorder.follow = false;
+        EXPECT_TRUE(parse(bytes, recorder));
+        EXPECT_EQ(recorder.count, (bytes.size() - header.size() - first.size()) / leaf.size());
+        EXPECT_EQ(wrong, 0) << shift;
+    }
+}
+
 // --- Documents that lie ---
 
 namespace {
@@ -499,16 +523,18 @@ struct SmallDocument {
     }
 };
 
+/// A second of processor time.
 class Deadline {
 public:
-    ~Deadline()
-    {
-        std::chrono::duration<double> const taken = std::chrono::steady_clock::now() - start_;
-        EXPECT_LT(taken.count(), 1.0);
-    }
+    ~Deadline() { EXPECT_LT(std::clock() - start_, slowness * CLOCKS_PER_SEC); }
 
 private:
-    std::chrono::steady_clock::time_point const start_ = std::chrono::steady_clock::now();
+#ifdef __SANITIZE_ADDRESS__
+    static constexpr std::clock_t slowness = 10;
+#else
+    static constexpr std::clock_t slowness = 1;
+#endif
+    std::clock_t const start_ = std::clock();
 };
 
 /// A recorder of a deep document would fill the memory itself.

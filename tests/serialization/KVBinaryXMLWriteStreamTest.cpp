@@ -342,3 +342,32 @@ TEST(KVBinaryXMLWriteStream, PatchesSizesInAFile)
     KVBufferWriteStream bytes(64, 64);
     EXPECT_TRUE(KVBinaryXMLWriteStream(bytes, 1, 0).getURL().isNull());
 }
+
+TEST(KVBinaryXMLWriteStream, WritesTheExampleOfItsPage)
+{
+    // The example's lines: indented pairs of digits up to two blanks, and what they mean.
+    std::istringstream page(contentsOf(KORVANE_SOURCE_DIR "/docs/scene-binary.md"));
+    std::string line;
+    while (std::getline(page, line) && !line.starts_with("    56 5A"))
+        ;
+    std::string expected;
+    for (; line.starts_with("    "); std::getline(page, line)) {
+        std::istringstream digits(line.substr(4, line.find("  ", 4) - 4));
+        for (unsigned int byte; digits >> std::hex >> byte;)
+            expected += static_cast<char>(byte);
+    }
+    KVScope table[] = {
+        {"a", 1, 0}, {"b", 1, 2}, {"c", 1, 3}, {"d", 2, 0}, {nullptr, 0, 0},
+    };
+    KVBufferWriteStream bytes(64, 64);
+    KVBinaryXMLWriteStream stream(bytes, 5, 10);
+    stream.pushScope(table);
+    stream.startElement(1);
+    stream.writeAttribute(2, 7);
+    stream.writeAttribute(3, KVString("b"));
+    stream.startElement(2);
+    stream.endElement();
+    stream.writeValue(0.5f);
+    stream.endElement();
+    EXPECT_EQ(textOf(bytes), expected);
+}

@@ -4,8 +4,6 @@
 
 #include <algorithm>
 #include <array>
-#include <cctype>
-#include <cmath>
 #include <cstdlib>
 #include <optional>
 

@@ -9,7 +9,10 @@
 
 #include <korvane/korvane.h>
 
+#include <algorithm>
 #include <charconv>
+#include <cmath>
+#include <memory>
 #include <optional>
 
 namespace {

@@ -11,11 +11,17 @@ class App;
 /// A command's work is its callback. It throws ToolError to end with a message and an exit code.
 using AddCommands = void (*)(CLI::App& program);
 
+void addBlendCommands(CLI::App& program);
 void addCaptionsCommands(CLI::App& program);
+void addLutCommands(CLI::App& program);
 void addMatrixCommands(CLI::App& program);
+void addMediaCommands(CLI::App& program);
+void addRangesCommands(CLI::App& program);
+void addSceneCommands(CLI::App& program);
+void addTimeCommands(CLI::App& program);
 
 /// The families, in the order in which `korvane --help` lists them.
 inline constexpr AddCommands commandFamilies[] = {
-    addMatrixCommands,
-    addCaptionsCommands,
+    addSceneCommands,  addTimeCommands, addRangesCommands, addCaptionsCommands,
+    addMatrixCommands, addLutCommands,  addBlendCommands,  addMediaCommands,
 };

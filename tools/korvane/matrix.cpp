@@ -10,6 +10,7 @@
 #include <cmath>
 #include <memory>
 #include <numbers>
+#include <span>
 
 namespace {
 
@@ -113,11 +114,13 @@ Json rowsOf(Matrix const& matrix)
 }
 
 /// Prints the matrix in a form that is read again.
-void printMatrix(Matrix const& matrix, bool json)
+void printMatrix(Matrix matrix, bool json)
 {
-    for (int i = 0; i < 16; ++i)
-        if (!std::isfinite(matrix.data()[i]))
+    for (double& value : std::span(matrix.data(), 16)) {
+        if (!std::isfinite(value))
             throw ToolError(ExitCode::Failed, "the result is out of range");
+        value += 0.0; // -0 becomes 0
+    }
     if (json) {
         printJson({{"matrix", rowsOf(matrix)}});
         return;
@@ -145,7 +148,7 @@ void decompose(Matrix const& matrix, bool json)
     }
     printJson({{"translation", axes(p.translation)},
                {"scale", axes(p.scale)},
-               {"rotation", axes(p.rotation)},
+               {"rotationRadians", axes(p.rotation)},
                {"shear", {{"x", p.shear.x}, {"y", p.shear.y}}},
                {"matrix", rowsOf(matrix)}});
 }

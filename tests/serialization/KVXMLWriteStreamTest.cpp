@@ -1,0 +1,413 @@
+#include "SerializationSupport.h"
+
+#include <cfloat>
+#include <climits>
+#include <clocale>
+#include <cmath>
+#include <functional>
+#include <limits>
+
+namespace {
+
+enum Token : unsigned { kOuter = 1, kInner, kLeaf };
+
+KVScope scope[] = {
+    {"outer", kOuter, 0}, {"name", kOuter, 1}, {"inner", kInner, 0},
+    {"at", kInner, 1},    {"leaf", kLeaf, 0},  {nullptr, 0, 0},
+};
+KVScope otherScope[] = {{"other", 9, 0}, {"exterior", kOuter, 0}, {nullptr, 0, 0}};
+KVScope emptyScope[] = {{nullptr, 0, 0}};
+
+constexpr char header[] = "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
+                          "<!DOCTYPE vzxmlscene>\n"
+                          "<vzml version=\"5.10\">\n\n";
+
+/// What `write` writes behind the header, with `scope` pushed.
+std::string body(std::function<void(KVXMLWriteStream&)> const& write)
+{
+    KVBufferWriteStream bytes(4096, 4096);
+    KVXMLWriteStream stream(bytes, 5, 10);
+    stream.pushScope(scope);
+    write(stream);
+    std::string const text = textOf(bytes);
+    EXPECT_EQ(text.substr(0, sizeof header - 1), header);
+    return text.substr(sizeof header - 1);
+}
+
+template <class T>
+std::string contentOf(T const& value)
+{
+    std::string const text = body([&](KVXMLWriteStream& stream) {
+        stream.startElement(kLeaf);
+        stream.writeValue(value);
+    });
+    EXPECT_EQ(text.substr(0, 6), "<leaf>");
+    return text.substr(6);
+}
+
+template <class T>
+std::string attributeOf(T const& value)
+{
+    std::string const text = body([&](KVXMLWriteStream& stream) {
+        stream.startElement(kOuter);
+        stream.writeAttribute(1, value);
+    });
+    EXPECT_EQ(text.substr(0, 13), "<outer name=\"");
+    EXPECT_EQ(text.back(), '"');
+    return text.substr(13, text.size() - 14);
+}
+
+template <class T>
+void expectBoth(T const& value, std::string const& text)
+{
+    EXPECT_EQ(contentOf(value), text);
+    EXPECT_EQ(attributeOf(value), text);
+}
+
+/// What `write` prints when it throws an `Exception`.
+template <class Exception>
+std::string printedBeforeThrow(std::function<void()> const& write)
+{
+    return printedBy([&] { EXPECT_THROW(write(), Exception); });
+}
+
+} // namespace
+
+TEST(KVXMLWriteStream, WritesADocument)
+{
+    KVBufferWriteStream bytes(16, 16);
+    KVXMLWriteStream stream(bytes, 5, 10);
+    stream.pushScope(scope);
+    stream.startElement(kOuter);
+    stream.writeAttribute(1, KVString("Opening"));
+    stream.startElement(kInner);
+    stream.writeAttribute(1, 3);
+    stream.startElement(kLeaf);
+    stream.endElement();
+    stream.startElement(kLeaf);
+    stream.writeValue(0.5);
+    stream.endElement();
+    stream.endElement();
+    stream.endElement();
+    stream.writeBlankLine();
+    stream.startElement(kInner);
+    stream.endElement();
+    stream.close();
+    EXPECT_EQ(textOf(bytes), std::string(header) + "<outer name=\"Opening\">\n"
+                                                   "\t<inner at=\"3\">\n"
+                                                   "\t\t<leaf/>\n"
+                                                   "\t\t<leaf>0.5</leaf>\n"
+                                                   "\t</inner>\n"
+                                                   "</outer>\n"
+                                                   "\n"
+                                                   "<inner/>\n"
+                                                   "\n</vzml>\n");
+}
+
+TEST(KVXMLWriteStream, WritesItsVersionAsSignedNumbers)
+{
+    KVBufferWriteStream bytes(16, 16);
+    KVXMLWriteStream(bytes, 0, 0xFFFFFFFF);
+    EXPECT_NE(textOf(bytes).find("<vzml version=\"0.-1\">"), std::string::npos);
+}
+
+TEST(KVXMLWriteStream, WritesNumbers)
+{
+    expectBoth(0, "0");
+    expectBoth(INT_MIN, "-2147483648");
+    expectBoth(UINT_MAX, "4294967295");
+    expectBoth(LLONG_MIN, "-9223372036854775808");
+    expectBoth(ULLONG_MAX, "18446744073709551615");
+    expectBoth(LONG_MIN, "-9223372036854775808");
+    expectBoth(ULONG_MAX, "18446744073709551615");
+    expectBoth(KVUUID{{0x1, 0xABCDEF, 0x89abcdef, 0}}, "0000000100abcdef89abcdef00000000");
+    expectBoth(CMTimeMake(1001, 30000), "1001 30000 1 0");
+    expectBoth(CMTime{-1, -600, 0xABCDEF01, -1}, "-1 -600 abcdef01 -1");
+    expectBoth(true, "1");
+}
+
+TEST(KVXMLWriteStream, WritesFloatingPointLikeTheCLocale)
+{
+    double const values[] = {
+        0.0,
+        -0.0,
+        1.0,
+        0.1,
+        1.0 / 3,
+        1e15,
+        1e16,
+        1e17,
+        1e-4,
+        1e-5,
+        123456.789,
+        2147483648,
+        99999999995.0,
+        DBL_MAX,
+        DBL_MIN,
+        4.94e-324,
+        1e100,
+        1e23,
+        5e-324,
+        -2.5,
+        9999999999.5,
+        12345678901,
+        0.000123456,
+        1e10,
+        INFINITY,
+        -INFINITY,
+        std::numeric_limits<double>::quiet_NaN(),
+        -std::numeric_limits<double>::quiet_NaN(),
+    };
+    for (double const value : values) {
+        char expected[64];
+        std::snprintf(expected, sizeof expected, "%.17lg", value);
+        expectBoth(value, expected);
+        float const narrow = static_cast<float>(value);
+        std::snprintf(expected, sizeof expected, "%.10g", static_cast<double>(narrow));
+        expectBoth(narrow, expected);
+    }
+    expectBoth(0.1, "0.10000000000000001");
+    expectBoth(0.1f, "0.1000000015");
+}
+
+TEST(KVXMLWriteStream, EscapesText)
+{
+    struct Row {
+        KVString text;
+        std::string written;
+    } const rows[] = {
+        {"plain", "plain"},
+        {"<a & \"b\">", "&lt;a &amp; &quot;b&quot;&gt;"},
+        {"&lt;", "&amp;lt;"},
+        {"it's\ttab\nline", "it's\ttab\nline"},
+        {"Réel € 𝄞 & ü<", "Réel € 𝄞 &amp; ü&lt;"},
+        {"", ""},
+        {KVString(), ""},
+        {KVString::fromUTF16({u"cut\0off", 7}), "cut"},
+        {KVString::fromUTF16(u"\xD834!"), "\xEF\xBF\xBD!"},
+        {KVString::repeat("\"é", 3000),
+         [] {
+             std::string text;
+             for (int i = 0; i < 3000; ++i)
+                 text += "&quot;é";
+             return text;
+         }()},
+    };
+    for (Row const& row : rows)
+        expectBoth(row.text, row.written);
+    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
+                  stream.startElement(kOuter);
+                  stream.writeOptionalAttribute(1, "<>");
+                  stream.endElement();
+              }),
+              "<outer name=\"&lt;&gt;\"/>\n");
+}
+
+// Meant: nothing keeps order between values, children and attributes.
+TEST(KVXMLWriteStream, WritesInTheOrderOfTheCalls)
+{
+    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
+                  stream.startElement(kOuter);
+                  stream.writeValue(1);
+                  stream.writeValue(2);
+                  stream.writeValue(KVString(" "));
+                  stream.writeAttribute(1, 3);
+                  stream.startElement(kLeaf); // on the line of the value, and the tag stays closed
+                  stream.endElement();
+                  stream.writeValue(4.5f);
+                  stream.endElement();
+              }),
+              "<outer>12  name=\"3\"\t<leaf/>\n4.5</outer>\n");
+    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
+                  stream.startElement(kOuter);
+                  stream.startElement(kLeaf);
+                  stream.endElement();
+                  stream.writeValue(CMTimeMake(1, 2));
+                  stream.endElement();
+              }),
+              "<outer>\n\t<leaf/>\n1 2 1 0</outer>\n");
+    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
+                  stream.startElement(kInner);
+                  stream.startElement(kInner);
+                  stream.startElement(kInner);
+                  stream.writeValue(7);
+                  stream.startElement(kLeaf);
+                  stream.endElement();
+                  stream.endElement();
+                  stream.endElement();
+                  stream.endElement();
+              }),
+              "<inner>\n\t<inner>\n\t\t<inner>7\t\t\t<leaf/>\n</inner>\n\t</inner>\n</inner>\n");
+}
+
+TEST(KVXMLWriteStream, WritesNoArrays)
+{
+    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
+                  unsigned int integers[] = {1, 2};
+                  float floats[] = {1, 2};
+                  double doubles[] = {1, 2};
+                  stream.startElement(kLeaf);
+                  stream.writeArray(integers, 2);
+                  stream.writeArray(floats, 2);
+                  stream.writeArray(doubles, 2);
+                  stream.reset();
+                  stream.endElement();
+              }),
+              "<leaf/>\n");
+}
+
+TEST(KVXMLWriteStream, NamesTokensByTheTopScopeAlone)
+{
+    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
+                  stream.pushScope(otherScope);
+                  stream.startElement(kOuter);
+                  EXPECT_THROW(stream.writeAttribute(1, 1), KVException_AttributeUndefined);
+                  stream.popScope();
+                  stream.writeAttribute(1, 2);
+                  stream.endElement();
+              }),
+              "<exterior name=\"2\"/>\n");
+}
+
+TEST(KVXMLWriteStream, ThrowsWithoutAScope)
+{
+    KVBufferWriteStream bytes(4096, 4096);
+    KVXMLWriteStream stream(bytes, 5, 10);
+    EXPECT_EQ(printedBeforeThrow<KVException_ScopeUndefined>([&] { stream.startElement(kOuter); }),
+              "scope not defined!\n");
+    stream.pushScope(nullptr);
+    EXPECT_EQ(printedBeforeThrow<KVException_ScopeUndefined>([&] { stream.startElement(kOuter); }),
+              "scope not defined!\n");
+    EXPECT_EQ(textOf(bytes), header);
+
+    stream.pushScope(scope);
+    stream.startElement(kOuter);
+    stream.popScope();
+    EXPECT_EQ(printedBeforeThrow<KVException_ScopeUndefined>([&] { stream.writeAttribute(1, 1); }),
+              "");
+    stream.popScope();
+    stream.popScope();
+    EXPECT_THROW(stream.writeAttribute(1, 1), KVException_ScopeUndefined);
+}
+
+// Meant: the parent's start tag counts as closed before the scope is looked at. Without a scope its
+// ">" is never written.
+TEST(KVXMLWriteStream, LosesTheEndOfATagWithoutAScope)
+{
+    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
+                  stream.startElement(kOuter);
+                  stream.popScope();
+                  EXPECT_EQ(printedBeforeThrow<KVException_ScopeUndefined>(
+                                [&] { stream.startElement(kLeaf); }),
+                            "scope not defined!\n");
+                  stream.writeValue(1);
+                  stream.endElement();
+              }),
+              "<outer1</outer>\n");
+}
+
+TEST(KVXMLWriteStream, ThrowsForAnUnknownToken)
+{
+    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
+                  stream.startElement(kOuter);
+                  EXPECT_EQ(printedBeforeThrow<KVException_NoElementDefined>(
+                                [&] { stream.startElement(77); }),
+                            "Token not defined in scope outer!\n");
+                  stream.endElement();
+              }),
+              "<outer>\n</outer>\n")
+        << "the parent's tag is closed all the same";
+    body([](KVXMLWriteStream& stream) {
+        stream.pushScope(emptyScope);
+        EXPECT_EQ(
+            printedBeforeThrow<KVException_NoElementDefined>([&] { stream.startElement(kOuter); }),
+            "Token not defined in scope (null)!\n");
+        stream.popScope();
+        stream.startElement(kOuter);
+        for (unsigned const token : {2u, 0u})
+            EXPECT_EQ(printedBeforeThrow<KVException_AttributeUndefined>(
+                          [&] { stream.writeAttribute(token, KVString("x")); }),
+                      "")
+                << token;
+        stream.pushScope(emptyScope);
+        EXPECT_THROW(stream.writeAttribute(1, 1), KVException_AttributeUndefined);
+    });
+}
+
+TEST(KVXMLWriteStream, ThrowsWithNoElementOpen)
+{
+    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
+                  auto const printed = [](std::function<void()> const& write) {
+                      return printedBeforeThrow<KVException_NoElementDefined>(write);
+                  };
+                  std::string const nothingToEnd = "endElement() called without startElement()!\n";
+                  EXPECT_EQ(printed([&] { stream.endElement(); }), nothingToEnd);
+                  EXPECT_EQ(printed([&] { stream.writeValue(1); }), nothingToEnd);
+                  EXPECT_EQ(printed([&] { stream.terminateStartTag(); }), nothingToEnd);
+                  EXPECT_EQ(printed([&] { stream.writeValue(KVString("x")); }),
+                            "value not within an element body!\n");
+                  EXPECT_EQ(printed([&] { stream.writeAttribute(1, 1); }), "");
+                  EXPECT_EQ(printed([&] { stream.writeAttribute(1, KVString("x")); }), "");
+              }),
+              "");
+}
+
+TEST(KVXMLWriteStream, TakesLongNamesAndDeepNesting)
+{
+    std::string const longName(5000, 'n');
+    KVScope longScope[] = {{longName.c_str(), 1, 0}, {longName.c_str(), 1, 1}, {nullptr, 0, 0}};
+    EXPECT_EQ(body([&](KVXMLWriteStream& stream) {
+                  stream.pushScope(longScope);
+                  stream.startElement(1);
+                  stream.writeAttribute(1, 1.5);
+                  stream.writeValue(2);
+                  stream.endElement();
+              }),
+              "<" + longName + " " + longName + "=\"1.5\">2</" + longName + ">\n");
+
+    constexpr int depth = 3000;
+    std::string const text = body([&](KVXMLWriteStream& stream) {
+        for (int i = 0; i < depth; ++i)
+            stream.startElement(kInner);
+        for (int i = 0; i < depth; ++i)
+            stream.endElement();
+    });
+    EXPECT_NE(text.find("\n" + std::string(depth - 1, '\t') + "<inner/>\n" +
+                        std::string(depth - 2, '\t') + "</inner>\n"),
+              std::string::npos);
+}
+
+TEST(KVXMLWriteStream, KnowsTheURLOfItsFile)
+{
+    TemporaryFolder const folder;
+    KVURL const url = urlOf(folder.file("scene.vzml"));
+    KVFileWriteStream file(url);
+    EXPECT_TRUE(KVXMLWriteStream(file, 1, 0).getURL() == url);
+    KVBufferWriteStream bytes(16, 16);
+    EXPECT_TRUE(KVXMLWriteStream(bytes, 1, 0).getURL().isNull());
+}
+
+TEST(KVXMLWriteStream, TellsOfAFullDisk)
+{
+    KVFileWriteStream file(urlOf("/dev/full"));
+    KVXMLWriteStream stream(file, 1, 0);
+    stream.pushScope(scope);
+    stream.startElement(kLeaf);
+    EXPECT_THROW(stream.writeValue(KVString::repeat("x", 60000)), KVException_WriteError);
+}
+
+TEST(KVXMLWriteStream, SetsTheNumericLocale)
+{
+    // Any other locale that this machine has; numbers must keep their point whatever happens later.
+    char const* other = nullptr;
+    for (char const* const name : {"de_DE.UTF-8", "fr_FR.UTF-8", "C.UTF-8", "POSIX"})
+        if (!other && std::setlocale(LC_NUMERIC, name))
+            other = name;
+    KVBufferWriteStream bytes(16, 16);
+    KVXMLWriteStream stream(bytes, 1, 0);
+    EXPECT_STREQ(std::setlocale(LC_NUMERIC, nullptr), "C");
+    if (other)
+        std::setlocale(LC_NUMERIC, other);
+    KVXMLReadStream reader("<a/>", 4);
+    EXPECT_STREQ(std::setlocale(LC_NUMERIC, nullptr), "C");
+}
