@@ -116,10 +116,8 @@ unsigned int lut_t::detectFormat(tfreader_t& reader)
     std::string_view line;
     std::string_view value;
     while (reader.readView(line)) {
-        if (tok(line, "#type:", value) && namesMGA(value)) {
-            kind = k3D;
+        if (tok(line, "#type:", value) && namesMGA(value))
             return kMGA;
-        }
         if (tok(line, "TITLE", value)) {
             std::string_view text;
             if (quoted(line, text))

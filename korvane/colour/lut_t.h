@@ -22,7 +22,7 @@ using rgb_t = std::array<float, 3>;
 ///
 /// | Format | Extension | Read | Written |
 /// |---|---|---|---|
-/// | Adobe Cube LUT 1.0 | .cube | 1D and 3D, the last with several tables in one file | 3D |
+/// | Adobe Cube LUT 1.0 | .cube | 1D and 3D, several tables in a file | 3D |
 /// | Pandora 3D LUT | .mga | 3D | 3D |
 ///
 /// Values are 16-bit, 0 to 65535 over the domain. Both formats hold the table as rows of text, so
@@ -45,8 +45,8 @@ public:
         virtual rgb_t process(rgb_t const& colour) const = 0;
     };
 
-    /// For kind 3D: red, green and blue of grid point (r, g, b) begin at 3 * ((b * size + g) * size
-    /// + r).
+    /// For kind 3D: red, green and blue of grid point (r, g, b) begin at
+    /// 3 * ((b * size + g) * size + r).
     vec_t<unsigned short> table;
     std::string title;
     /// The file's name without its folder and without ".cube" or ".mga".
@@ -71,8 +71,8 @@ public:
     /// entries for .mga, 1 MiB of a line; no memory is taken for rows that the file is too short
     /// for.
     int read(char const* path, unsigned long index);
-    /// The readers of one format, for a file that stands at its first line. They take from the file
-    /// all but `name`.
+    /// The readers of one format, for a file that stands at its first line. They set neither `name`
+    /// nor, for .cube, `title`.
     int readMGA(tfreader_t& reader, unsigned long index);
     int readCUBE(tfreader_t& reader, unsigned long index);
 

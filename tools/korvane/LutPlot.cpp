@@ -1,5 +1,7 @@
 #include "LutPlot.h"
 
+#include "Numbers.h"
+
 #include <algorithm>
 #include <charconv>
 #include <cmath>
@@ -21,12 +23,6 @@ std::string number(double value, int digits = 2)
         std::to_chars(std::begin(text), std::end(text), value, std::chars_format::fixed, digits)
             .ptr;
     return {text, end};
-}
-
-std::string shortest(float value)
-{
-    char text[64];
-    return {text, std::to_chars(std::begin(text), std::end(text), value).ptr};
 }
 
 std::string escaped(std::string const& text)

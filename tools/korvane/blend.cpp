@@ -6,6 +6,7 @@
 #include <korvane/foundation/KVException.h>
 
 #include <algorithm>
+#include <cctype>
 #include <memory>
 #include <optional>
 #include <sstream>

@@ -3,12 +3,14 @@
 #include "LutDiagnosis.h"
 #include "LutLookup.h"
 #include "LutPlot.h"
+#include "Numbers.h"
 #include "ToolError.h"
 #include "commands.h"
 
 #include <korvane/colour/multilut_t.h>
 
 #include <algorithm>
+#include <cctype>
 #include <cerrno>
 #include <charconv>
 #include <cmath>
@@ -107,12 +109,6 @@ private:
 };
 
 // --- Numbers and names ---
-
-std::string shortest(float value)
-{
-    char text[32];
-    return {text, std::to_chars(text, text + sizeof text, value).ptr};
-}
 
 /// False for what is not one finite number and nothing else.
 bool parse(std::string_view word, float& value)
