@@ -92,11 +92,12 @@ void Node::readValues(KVStreamElement& element)
     if (info().content == Kind::None)
         return;
     KVString text;
-    if (findings_ && element.getAsString(&text))
+    element.getAsString(&text);
+    if (findings_)
         tellIfMalformed(info().name, text, info().content, element);
+    if (text.empty()) // the compact form would read nothing as the number 0
+        return;
     content_ = readContent(element, info().content);
-    if (auto const* string = std::get_if<KVString>(&content_); string && string->empty())
-        content_ = {};
 }
 
 void Node::tellIfMalformed(std::string const& place, KVString const& text, Kind kind,

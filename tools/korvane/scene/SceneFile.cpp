@@ -143,16 +143,20 @@ void refuseEmpty(std::string const& path, unsigned long long bytes)
         throw badInput(path, "the file is empty");
 }
 
-void loadStandardInput(std::string const& path, Document& document, bool strict)
+} // namespace
+
+char const* nameOf(Form form) noexcept
 {
-    std::string const bytes = readFile(path);
+    return form == Form::Text ? "text" : "binary";
+}
+
+void loadBytes(std::string_view bytes, std::string const& path, Document& document, bool strict)
+{
     refuseEmpty(path, bytes.size());
     document.bytes = bytes.size();
     document.form = formOf(bytes);
     if (document.form == Form::Binary) {
-        auto const data = KVCFRef<CFDataRef>::adopt(
-            CFDataCreate(nullptr, bytes.data(), static_cast<CFIndex>(bytes.size())));
-        KVBufferReadStream stream(data);
+        KVBufferReadStream stream(bytes.data(), bytes.size());
         return loadBinary(stream, path, document, strict);
     }
     if (bytes.size() > static_cast<std::size_t>(std::numeric_limits<int>::max()))
@@ -161,17 +165,10 @@ void loadStandardInput(std::string const& path, Document& document, bool strict)
     loadText(stream, path, document, strict);
 }
 
-} // namespace
-
-char const* nameOf(Form form) noexcept
-{
-    return form == Form::Text ? "text" : "binary";
-}
-
 void load(std::string const& path, Document& document, bool strict)
 {
     if (path == "-")
-        return loadStandardInput(path, document, strict);
+        return loadBytes(readFile(path), path, document, strict);
     checkReadable(path);
     std::error_code error;
     document.bytes = std::filesystem::file_size(path, error);
