@@ -36,7 +36,7 @@ std::unique_ptr<CLI::App> makeApp()
     app->set_help_all_flag("--help-all", "Print the help of every command");
     app->require_subcommand(1);
     app->footer(exitCodes);
-    for (AddCommands const* add = commandFamilies; *add != nullptr; ++add)
-        (*add)(*app);
+    for (AddCommands add : commandFamilies)
+        add(*app);
     return app;
 }
