@@ -26,6 +26,32 @@ char* formatHexWord(char* out, std::uint32_t word) noexcept
     return out;
 }
 
+/// Numbers of up to ten binary places, such as 3, 0.5 and 249.75, whose decimals end after as many.
+/// Null for others, and where "%g" would round them or write an exponent.
+char* formatShort(char* out, double value, int digits) noexcept
+{
+    constexpr double most = 1ull << 40;
+    double const scaled = std::abs(value) * 1024;
+    if (!(scaled < most))
+        return nullptr;
+    auto const exact = static_cast<std::uint64_t>(scaled);
+    if (static_cast<double>(exact) != scaled)
+        return nullptr;
+    if (std::signbit(value))
+        *out++ = '-';
+    char* const start = out;
+    out = formatInteger(out, exact >> 10);
+    std::uint64_t fraction = (exact & 1023) * 9765625; // ten digits
+    if (fraction == 0)
+        return out;
+    *out++ = '.';
+    for (std::uint64_t power = 1'000'000'000; fraction != 0; power /= 10) {
+        *out++ = static_cast<char>('0' + fraction / power);
+        fraction %= power;
+    }
+    return out - start - 1 <= digits ? out : nullptr;
+}
+
 /// 16 or more for what is no hexadecimal digit.
 constexpr unsigned int digitValue(char c) noexcept
 {
@@ -239,6 +265,8 @@ char* kvFormat(char* out, float value) noexcept
 
 char* kvFormat(char* out, double value, int digits) noexcept
 {
+    if (char* const end = formatShort(out, value, digits))
+        return end;
     return std::to_chars(out, out + kvNumberTextSize, value, std::chars_format::general, digits)
         .ptr;
 }

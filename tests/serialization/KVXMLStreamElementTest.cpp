@@ -1,8 +1,10 @@
 #include "SerializationSupport.h"
 
+#include <bit>
 #include <cfloat>
 #include <climits>
 #include <cmath>
+#include <random>
 
 namespace {
 
@@ -136,6 +138,37 @@ TEST(KVXMLStreamElement, ReadsFloatingPointLikeTheCLocale)
     EXPECT_EQ(narrow, 16777216.0f);
     EXPECT_FALSE(elementWith("1e39")->getAsFloat(&narrow));
     EXPECT_TRUE(std::isinf(narrow));
+}
+
+TEST(KVXMLStreamElement, ReadsEveryNumberToTheNearest)
+{
+    std::mt19937_64 random(11);
+    for (int i = 0; i < 20000; ++i) {
+        double const value = std::bit_cast<double>(random() % 2 ? random()
+                                                                : (random() & 0x800FFFFFFFFFFFFF) |
+                                                                      (990 + random() % 60) << 52);
+        if (!std::isfinite(value) || (value != 0 && std::abs(value) < 1e-30))
+            continue;
+        char text[400];
+        int const digits = static_cast<int>(random() % 22);
+        if (i % 3 == 0)
+            std::snprintf(text, sizeof text, "%.*g", digits, value);
+        else if (i % 3 == 1)
+            std::snprintf(text, sizeof text, "%.*e", digits, value);
+        else
+            std::snprintf(text, sizeof text, "%.*f", digits, value);
+        auto const element = elementWith(text);
+        double wide = 0;
+        float narrow = 0;
+        element->getAsDouble(&wide);
+        ASSERT_EQ(wide, std::strtod(text, nullptr)) << text;
+        elementWith(text)->getAsFloat(&narrow);
+        ASSERT_EQ(narrow, std::strtof(text, nullptr)) << text;
+    }
+    // Half-way between two floats as a double, and not as written.
+    float narrow = 0;
+    elementWith("16777217.000000001")->getAsFloat(&narrow);
+    EXPECT_EQ(narrow, 16777218.0f);
 }
 
 TEST(KVXMLStreamElement, GivesFalseWithoutText)

@@ -6,6 +6,7 @@
 #include <cmath>
 #include <functional>
 #include <limits>
+#include <random>
 
 namespace {
 
@@ -168,6 +169,25 @@ TEST(KVXMLWriteStream, WritesFloatingPointLikeTheCLocale)
     }
     expectBoth(0.1, "0.10000000000000001");
     expectBoth(0.1f, "0.1000000015");
+
+    // Numbers with few binary places, and just beyond them.
+    std::mt19937_64 random(5);
+    KVBufferWriteStream bytes(1 << 20, 1 << 20);
+    KVXMLWriteStream stream(bytes, 1, 0);
+    stream.pushScope(scope);
+    stream.startElement(kLeaf);
+    for (int i = 0; i < 20000; ++i) {
+        double const value =
+            std::ldexp(static_cast<double>(static_cast<std::int64_t>(random()) >> (random() % 63)),
+                       -static_cast<int>(random() % 13));
+        char expected[64];
+        bytes.reset();
+        stream.writeValue(i % 2 ? value : 0);
+        stream.writeValue(static_cast<float>(value));
+        std::snprintf(expected, sizeof expected, "%.17lg%.10g", i % 2 ? value : 0.0,
+                      static_cast<double>(static_cast<float>(value)));
+        ASSERT_EQ(textOf(bytes).substr(i == 0), expected);
+    }
 }
 
 TEST(KVXMLWriteStream, EscapesText)
