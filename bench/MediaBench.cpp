@@ -134,7 +134,8 @@ long peakKB()
     return 0;
 }
 
-/// In a process of its own, so that nothing else counts: the peak of the resident set above what it was before.
+/// In a process of its own, so that nothing else counts: the peak of the resident set above what it
+/// was before.
 void rewriteMemory(benchmark::State& state)
 {
     files();

@@ -13,9 +13,12 @@
 #include <korvane/platform/CFURL.h>
 #include <korvane/platform/CMTime.h>
 #include <korvane/platform/CMTimeRange.h>
+#include <korvane/platform/KVKeyedCoder.h>
 #include <korvane/platform/NSAffineTransform.h>
 #include <korvane/platform/NSAttributedString.h>
+#include <korvane/platform/NSCoder.h>
 #include <korvane/platform/NSColor.h>
+#include <korvane/platform/NSError.h>
 #include <korvane/platform/NSFont.h>
 #include <korvane/platform/NSObject.h>
 #include <korvane/platform/NSRange.h>
@@ -42,13 +45,6 @@
 #include <korvane/foundation/KVUUID.h>
 #include <korvane/foundation/KVVersion.h>
 
-#include <korvane/cache/KVCache.h>
-#include <korvane/cache/KVCacheImpl.h>
-#include <korvane/cache/KVCachedFunctionImpl.h>
-#include <korvane/cache/KVEvictionHeap.h>
-#include <korvane/platform/KVKeyedCoder.h>
-#include <korvane/platform/NSCoder.h>
-#include <korvane/platform/NSError.h>
 #include <korvane/serialization/KVAsciiStream.h>
 #include <korvane/serialization/KVBinaryXMLField.h>
 #include <korvane/serialization/KVBinaryXMLReadStream.h>
@@ -84,23 +80,11 @@
 #include <korvane/time/VexTimeRangeObj.h>
 #include <korvane/time/VexTimeRanges.h>
 
-#include <korvane/captions/KVCaption.h>
-#include <korvane/captions/KVCaptionCEA608.h>
-#include <korvane/captions/KVCaptionSRT.h>
-#include <korvane/captions/KVCaptionText.h>
-#include <korvane/captions/KVCaptioniTT.h>
-#include <korvane/captions/KVMutableCaption.h>
-#include <korvane/captions/KVSRTCaptionsExporter.h>
-#include <korvane/captions/KVSRTCaptionsImporter.h>
-#include <korvane/colour/lut_t.h>
-#include <korvane/colour/multilut_t.h>
-#include <korvane/colour/tfreader_t.h>
-#include <korvane/colour/vec_t.h>
-#include <korvane/media/KVAtomBox.h>
-#include <korvane/media/KVAtomBoxFile.h>
-#include <korvane/media/KVAtomMetadataHandler.h>
-#include <korvane/media/KVImageDescAtomBox.h>
-#include <korvane/media/KVXMPStringParser.h>
+#include <korvane/cache/KVCache.h>
+#include <korvane/cache/KVCacheImpl.h>
+#include <korvane/cache/KVCachedFunctionImpl.h>
+#include <korvane/cache/KVEvictionHeap.h>
+
 #include <korvane/numerics/KVMatrix33Tmpl.h>
 #include <korvane/numerics/KVMatrix44Double.h>
 #include <korvane/numerics/KVMatrix44Measure.h>
@@ -111,6 +95,16 @@
 #include <korvane/numerics/KVVector2.h>
 #include <korvane/numerics/KVVector3.h>
 #include <korvane/numerics/KVVector4.h>
+
+#include <korvane/colour/lut_t.h>
+#include <korvane/colour/multilut_t.h>
+#include <korvane/colour/tfreader_t.h>
+#include <korvane/colour/vec_t.h>
+
+#include <korvane/compositing/KVBlend.h>
+#include <korvane/compositing/KVFxBlendOptions.h>
+#include <korvane/compositing/KVFxLightWrapOptions.h>
+
 #include <korvane/captions/KVCaption.h>
 #include <korvane/captions/KVCaptionCEA608.h>
 #include <korvane/captions/KVCaptionSRT.h>
@@ -119,12 +113,9 @@
 #include <korvane/captions/KVMutableCaption.h>
 #include <korvane/captions/KVSRTCaptionsExporter.h>
 #include <korvane/captions/KVSRTCaptionsImporter.h>
+
 #include <korvane/media/KVAtomBox.h>
 #include <korvane/media/KVAtomBoxFile.h>
 #include <korvane/media/KVAtomMetadataHandler.h>
 #include <korvane/media/KVImageDescAtomBox.h>
 #include <korvane/media/KVXMPStringParser.h>
-
-#include <korvane/compositing/KVBlend.h>
-#include <korvane/compositing/KVFxBlendOptions.h>
-#include <korvane/compositing/KVFxLightWrapOptions.h>

@@ -14,7 +14,8 @@ int main()
 
     // A shot of 100 frames from there, and what is left of it without a second in the middle.
     auto const shot = KVMakeRef<VexTimeRangeObj>(CMTimeRangeMake(cut, 100 * frame));
-    auto const gap = KVMakeRef<VexTimeRangeObj>(CMTimeRangeMake(CMTimeMake(5, 1), CMTimeMake(1, 1)));
+    auto const gap =
+        KVMakeRef<VexTimeRangeObj>(CMTimeRangeMake(CMTimeMake(5, 1), CMTimeMake(1, 1)));
     for (VexTimeRangeObj const* piece : VexTimeRangeObjSubtractSortedRanges(shot, {gap}))
         std::cout << piece->description() << '\n'; // [3.503500, 5.000000) [6.000000, 7.674333)
 
