@@ -57,7 +57,7 @@ bool hasTooManyAttributes(std::string_view text) noexcept
 
 KVString fromXML(xmlChar const* text)
 {
-    return KVString::fromUTF8(reinterpret_cast<char const*>(text ? text : BAD_CAST ""));
+    return text ? KVString::fromUTF8(reinterpret_cast<char const*>(text)) : KVString("");
 }
 
 struct FreeContext {
@@ -72,7 +72,7 @@ struct FreeContext {
 
 /// What libxml2 calls. No exception may pass through it: the first one is kept, and parsing stops.
 struct KVXMPStringParser::Handlers {
-    KVXMPStringParser& parser;
+    KVXMPStringParser& target;
     xmlParserCtxt* context = nullptr;
     std::exception_ptr exception = nullptr;
 
@@ -83,7 +83,7 @@ struct KVXMPStringParser::Handlers {
         if (self.exception)
             return;
         try {
-            function(self.parser);
+            function(self.target);
         } catch (...) {
             self.exception = std::current_exception();
             xmlStopParser(self.context);
@@ -191,7 +191,7 @@ bool KVXMPStringParser::parseXMPData(CFDataRef data)
     xmlCtxtUseOptions(context.get(), XML_PARSE_NONET | XML_PARSE_IGNORE_ENC);
     // A name of an encoding that is there already keeps the parser from guessing one.
     xmlSwitchEncoding(context.get(), XML_CHAR_ENCODING_UTF8);
-    context->encoding = xmlStrdup(BAD_CAST "UTF-8");
+    context->encoding = xmlCharStrdup("UTF-8");
 
     xmlParseDocument(context.get());
     if (handlers.exception)
