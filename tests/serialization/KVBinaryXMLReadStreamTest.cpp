@@ -652,7 +652,7 @@ TEST(KVBinaryXMLReadStream, AllocatesNothingForIntegers)
         out.startElement(3);
         long const before = allocations::count();
         for (int i = 0; i < count; ++i)
-            out.writeValue(i * 1000003);
+            out.writeValue(static_cast<int>(i * 1000003u));
         EXPECT_EQ(allocations::count(), before);
         out.endElement();
         Counter counter;
