@@ -18,6 +18,12 @@ std::string bytesOf(KVBufferWriteStream const& stream)
 }
 
 struct Documents {
+    /// Is full when it is asked as often as the text form was until it had its size.
+    auto sameClips() const
+    {
+        return [count = std::size_t(0), end = fullAt]() mutable { return ++count >= end; };
+    }
+
     Documents()
     {
         KVBufferWriteStream bytes(1 << 20, 1 << 20);
@@ -37,12 +43,6 @@ struct Documents {
         KVBinaryXMLWriteStream other(compact, 5, 10);
         writeClips(other, sameClips());
         binary = bytesOf(compact);
-    }
-
-    /// Is full when it is asked as often as the text form was until it had its size.
-    auto sameClips() const
-    {
-        return [count = std::size_t(0), end = fullAt]() mutable { return ++count >= end; };
     }
 
     std::size_t fullAt = 0;

@@ -18,7 +18,7 @@ KVCaption* KVCaptionSRT::newCopy() const
 
 KVCaption* KVCaptionSRT::newMutableCopy() const
 {
-    return new KVMutableCaptionSRT(*this);
+    return new KVMutableCaptionSRT(attributedString(), timeRange());
 }
 
 KVNSRef<KVCaptionSRT*> KVCaptionSRT::copy() const
@@ -28,7 +28,7 @@ KVNSRef<KVCaptionSRT*> KVCaptionSRT::copy() const
 
 KVNSRef<KVMutableCaptionSRT*> KVCaptionSRT::mutableCopy() const
 {
-    return KVMakeRef<KVMutableCaptionSRT>(*this);
+    return KVMakeRef<KVMutableCaptionSRT>(attributedString(), timeRange());
 }
 
 NSCodingClass const KVCaptionSRT::coding = {

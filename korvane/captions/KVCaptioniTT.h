@@ -28,6 +28,8 @@ public:
     RubyText const& rubyText() const noexcept { return rubyText_; }
     bool hasRuby() const noexcept { return hasRubyInternal_; }
     bool hasRubyInternal() const noexcept { return hasRubyInternal_; }
+    /// Looks at the entries again.
+    void recalculateHasRuby() noexcept;
     /// The ruby over a unit, the null string for none, and the widest run whose entries are the
     /// same object.
     KVString rubyTextAtIndex(std::size_t index, NSRange* range = nullptr) const;
@@ -51,9 +53,6 @@ public:
 protected:
     /// Drops the ruby if the plain text changes; a change of attributes alone keeps it.
     void assignAttributedString(NSAttributedString const* string) override;
-    /// Looks at the entries again.
-    void recalculateHasRuby() noexcept;
-
     KVString regionString_;
     RubyText rubyText_;
     bool hasRubyInternal_ = false;

@@ -19,8 +19,9 @@ namespace {
 template <class T>
 using MallocPtr = std::unique_ptr<T, decltype(&std::free)>;
 
-/// Up to `wanted` return addresses; the array grows as the stack turns out to be deep.
-std::vector<void*> captureFrames(long long wanted)
+/// Up to `wanted` return addresses; the array grows as the stack turns out to be deep. Always part
+/// of its caller, so that the innermost frame is the caller's own.
+[[gnu::always_inline]] inline std::vector<void*> captureFrames(long long wanted)
 {
     std::vector<void*> frames;
     if (wanted <= 0)

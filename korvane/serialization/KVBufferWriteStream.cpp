@@ -52,7 +52,8 @@ void KVBufferWriteStream::grow(unsigned long long end)
     unsigned long long const step = std::max(
         {static_cast<unsigned long long>(std::max(step_, 0)), end - capacity_, capacity_ / 2});
     unsigned long long const capacity = std::min(capacity_ + step, mostBytes);
-    auto* const grown = static_cast<unsigned char*>(std::realloc(block_.get(), capacity));
+    auto* const grown =
+        static_cast<unsigned char*>(std::realloc(block_.get(), std::max<std::size_t>(capacity, 1)));
     if (!grown)
         throw KVException_WriteError();
     static_cast<void>(block_.release());

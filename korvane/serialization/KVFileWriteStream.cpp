@@ -67,7 +67,7 @@ void KVFileWriteStream::File::write(unsigned char const* data, unsigned long lon
             return;
         leavePatch();
     }
-    if (length > capacity - current) {
+    if (length >= capacity || length > capacity - current) {
         flush();
         if (length >= capacity) {
             check(descriptor.writeAll(data, length));

@@ -72,10 +72,10 @@ void KVHash128::transform(unsigned int const* block) noexcept
 
 KVHash128& KVHash128::operator+=(KVHash128 const& other) noexcept
 {
+    startIfNeeded(*this);
     // Behind the four words stands a whole word with its top bit set, not the byte 0x80 of addData.
     unsigned int const block[16] = {other.words[0], other.words[1], other.words[2], other.words[3],
                                     0x80000000u};
-    startIfNeeded(*this);
     transform(block);
     return *this;
 }
