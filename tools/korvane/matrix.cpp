@@ -1,5 +1,6 @@
 #include "Input.h"
 #include "Json.h"
+#include "Numbers.h"
 #include "ToolError.h"
 #include "commands.h"
 
@@ -98,12 +99,6 @@ private:
 
     std::vector<std::string> words_;
 };
-
-std::string shortest(double value)
-{
-    char text[32];
-    return {text, std::to_chars(text, text + sizeof text, value).ptr};
-}
 
 Json rowsOf(Matrix const& matrix)
 {

@@ -1,5 +1,7 @@
 #include "Value.h"
 
+#include "../Numbers.h"
+
 #include <korvane/time/KVTime.h>
 
 #include <algorithm>
@@ -56,14 +58,6 @@ void write(Value const& value, Write out)
             }
         },
         value);
-}
-
-template <class T>
-std::string shortest(T number)
-{
-    char text[64];
-    auto const end = std::to_chars(text, text + sizeof text, number).ptr;
-    return {text, end};
 }
 
 std::string textOf(KVUUID const& uuid)
