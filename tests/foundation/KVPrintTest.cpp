@@ -111,7 +111,6 @@ TEST(KVLog, AddsThePositionAsFarAsItFits)
         std::string logged;
     } const rows[] = {
         {0, position},
-        {10, std::string(10, 'x') + position},
         {1020, std::string(1020, 'x') + " (f"},
         {1022, std::string(1022, 'x') + " "},
         {1023, std::string(1023, 'x')},
