@@ -149,11 +149,9 @@ TEST(KVBinaryXMLWriteStream, WritesVariableLengthNumbers)
         KVBinaryXMLWriteStream::writeVarInt(bytes, row.value);
         EXPECT_EQ(textOf(bytes), row.expected) << row.value;
     }
-    // A magnitude of one has no sign.
     KVBufferWriteStream bytes(64, 64);
-    for (unsigned long long const magnitude : {1, 0, 2})
-        KVBinaryXMLWriteStream::writeInt(bytes, magnitude, true);
-    EXPECT_EQ(textOf(bytes), "\x81\x80\x18\x02");
+    KVBinaryXMLWriteStream::writeInt(bytes, 1ULL, true); // a magnitude of one has no sign
+    EXPECT_EQ(textOf(bytes), "\x81");
 }
 
 TEST(KVBinaryXMLWriteStream, WritesElementsWithTheirSizes)
@@ -228,31 +226,25 @@ TEST(KVBinaryXMLWriteStream, RefusesWhatHasNoName)
 {
     KVBufferWriteStream bytes(64, 64);
     KVBinaryXMLWriteStream stream(bytes, 1, 0);
-    EXPECT_EQ(printedBy([&] { EXPECT_THROW(stream.startElement(1), KVException_ScopeUndefined); }),
-              "scope not defined!\n");
-    EXPECT_EQ(printedBy([&] { EXPECT_THROW(stream.endElement(), KVException_NoElementDefined); }),
-              "endElement() called without startElement()!\n");
-    EXPECT_EQ(printedBy([&] {
-                  EXPECT_THROW(stream.writeValue(1), KVException_NoElementDefined);
-                  EXPECT_THROW(stream.writeValue(KVString("a")), KVException_NoElementDefined);
-                  EXPECT_THROW(stream.writeAttribute(2, 1), KVException_NoElementDefined);
-                  EXPECT_THROW(stream.writeAttribute(2, KVString()), KVException_NoElementDefined);
-              }),
-              "");
+    auto const start = [&](unsigned token) { return refusal([&] { stream.startElement(token); }); };
+    auto const attribute = [&](unsigned token, auto value) {
+        return refusal([&] { stream.writeAttribute(token, value); });
+    };
+    EXPECT_EQ(start(1), "scope: scope not defined!\n");
+    EXPECT_EQ(refusal([&] { stream.endElement(); }),
+              "element: endElement() called without startElement()!\n");
+    EXPECT_EQ(refusal([&] { stream.writeValue(1); }), "element: ");
+    EXPECT_EQ(refusal([&] { stream.writeValue(KVString("a")); }), "element: ");
+    EXPECT_EQ(attribute(2, 1), "element: ");
+    EXPECT_EQ(attribute(2, KVString("a")), "element: ");
     stream.pushScope(scope);
     stream.startElement(1);
-    EXPECT_EQ(
-        printedBy([&] { EXPECT_THROW(stream.startElement(9), KVException_NoElementDefined); }),
-        "Token not defined in scope scene!\n");
-    EXPECT_EQ(printedBy([&] {
-                  EXPECT_THROW(stream.writeAttribute(9, 1), KVException_AttributeUndefined);
-                  EXPECT_THROW(stream.writeAttribute(9, KVString()),
-                               KVException_AttributeUndefined);
-                  EXPECT_THROW(stream.writeAttribute(0, 1), KVException_AttributeUndefined);
-                  stream.pushScope(nullptr);
-                  EXPECT_THROW(stream.writeAttribute(2, 1), KVException_ScopeUndefined);
-              }),
-              "");
+    EXPECT_EQ(start(9), "element: Token not defined in scope scene!\n");
+    EXPECT_EQ(attribute(9, 1), "attribute: ");
+    EXPECT_EQ(attribute(9, KVString("a")), "attribute: ");
+    EXPECT_EQ(attribute(0, 1), "attribute: ");
+    stream.pushScope(nullptr);
+    EXPECT_EQ(attribute(2, 1), "scope: ");
     // The failed start has put out the count of the parent's attributes: none can be added.
     stream.popScope();
     stream.writeAttribute(2, 1);

@@ -48,13 +48,6 @@ void expectBoth(T const& value, std::string const& text)
               "<outer name=\"" + text + "\">" + text);
 }
 
-/// What `write` prints when it throws an `Exception`.
-template <class Exception, class Body>
-std::string printedBeforeThrow(Body write)
-{
-    return printedBy([&] { EXPECT_THROW(write(), Exception); });
-}
-
 } // namespace
 
 // Meant: arrays leave no trace in this form.
@@ -174,25 +167,17 @@ TEST(KVXMLWriteStream, WritesInTheOrderOfTheCalls)
     EXPECT_EQ(body([](KVXMLWriteStream& stream) {
                   stream.startElement(kOuter);
                   stream.writeValue(1);
-                  stream.writeValue(2);
                   stream.writeValue(KVString(" "));
                   stream.writeAttribute(1, 3);
                   stream.startElement(kLeaf); // on the line of the value, and the tag stays closed
                   stream.endElement();
                   stream.writeValue(4.5f);
                   stream.endElement();
-              }),
-              "<outer>12  name=\"3\"\t<leaf/>\n4.5</outer>\n");
-    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
                   stream.startElement(kOuter);
                   stream.startElement(kLeaf);
                   stream.endElement();
                   stream.writeValue(CMTimeMake(1, 2));
                   stream.endElement();
-              }),
-              "<outer>\n\t<leaf/>\n1 2 1 0</outer>\n");
-    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
-                  stream.startElement(kInner);
                   stream.startElement(kInner);
                   stream.startElement(kInner);
                   stream.writeValue(7);
@@ -200,105 +185,93 @@ TEST(KVXMLWriteStream, WritesInTheOrderOfTheCalls)
                   stream.endElement();
                   stream.endElement();
                   stream.endElement();
-                  stream.endElement();
               }),
-              "<inner>\n\t<inner>\n\t\t<inner>7\t\t\t<leaf/>\n</inner>\n\t</inner>\n</inner>\n");
+              "<outer>1  name=\"3\"\t<leaf/>\n4.5</outer>\n"
+              "<outer>\n\t<leaf/>\n1 2 1 0</outer>\n"
+              "<inner>\n\t<inner>7\t\t<leaf/>\n</inner>\n</inner>\n");
 }
 
-TEST(KVXMLWriteStream, NamesTokensByTheTopScopeAlone)
+TEST(KVXMLWriteStream, RefusesWhatHasNoName)
 {
-    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
-                  stream.pushScope(otherScope);
-                  stream.startElement(kOuter);
-                  EXPECT_THROW(stream.writeAttribute(1, 1), KVException_AttributeUndefined);
-                  stream.popScope();
-                  stream.writeAttribute(1, 2);
-                  stream.endElement();
-              }),
-              "<exterior name=\"2\"/>\n");
-}
-
-TEST(KVXMLWriteStream, ThrowsWithoutAScope)
-{
-    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
-                  auto const start = [&] { stream.startElement(kOuter); };
-                  stream.popScope();
-                  EXPECT_EQ(printedBeforeThrow<KVException_ScopeUndefined>(start),
-                            "scope not defined!\n");
-                  stream.pushScope(nullptr);
-                  EXPECT_EQ(printedBeforeThrow<KVException_ScopeUndefined>(start),
-                            "scope not defined!\n");
-                  stream.pushScope(scope);
-                  start();
-                  stream.popScope();
-                  for (int i = 0; i < 2; ++i) { // with a null scope, and without one
-                      EXPECT_EQ(printedBeforeThrow<KVException_ScopeUndefined>(
-                                    [&] { stream.writeAttribute(1, 1); }),
-                                "");
-                      stream.popScope();
-                  }
-              }),
-              "<outer");
-}
-
-// Meant: the parent's start tag counts as closed before the scope is looked at. Without a scope its
-// ">" is never written.
-TEST(KVXMLWriteStream, LosesTheEndOfATagWithoutAScope)
-{
-    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
-                  stream.startElement(kOuter);
-                  stream.popScope();
-                  EXPECT_EQ(printedBeforeThrow<KVException_ScopeUndefined>(
-                                [&] { stream.startElement(kLeaf); }),
-                            "scope not defined!\n");
-                  stream.writeValue(1);
-                  stream.endElement();
-              }),
-              "<outer1</outer>\n");
-}
-
-TEST(KVXMLWriteStream, ThrowsForAnUnknownToken)
-{
-    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
-                  stream.startElement(kOuter);
-                  EXPECT_EQ(printedBeforeThrow<KVException_NoElementDefined>(
-                                [&] { stream.startElement(77); }),
-                            "Token not defined in scope outer!\n");
-                  stream.endElement();
-              }),
-              "<outer>\n</outer>\n")
-        << "the parent's tag is closed all the same";
-    body([](KVXMLWriteStream& stream) {
-        stream.pushScope(emptyScope);
-        EXPECT_EQ(
-            printedBeforeThrow<KVException_NoElementDefined>([&] { stream.startElement(kOuter); }),
-            "Token not defined in scope (null)!\n");
-        stream.popScope();
-        stream.startElement(kOuter);
-        for (unsigned const token : {2u, 0u})
-            EXPECT_EQ(printedBeforeThrow<KVException_AttributeUndefined>(
-                          [&] { stream.writeAttribute(token, KVString("x")); }),
-                      "")
-                << token;
-    });
-}
-
-TEST(KVXMLWriteStream, ThrowsWithNoElementOpen)
-{
-    EXPECT_EQ(body([](KVXMLWriteStream& stream) {
-                  auto const printed = [](auto write) {
-                      return printedBeforeThrow<KVException_NoElementDefined>(write);
-                  };
-                  std::string const nothingToEnd = "endElement() called without startElement()!\n";
-                  EXPECT_EQ(printed([&] { stream.endElement(); }), nothingToEnd);
-                  EXPECT_EQ(printed([&] { stream.writeValue(1); }), nothingToEnd);
-                  EXPECT_EQ(printed([&] { stream.terminateStartTag(); }), nothingToEnd);
-                  EXPECT_EQ(printed([&] { stream.writeValue(KVString("x")); }),
-                            "value not within an element body!\n");
-                  EXPECT_EQ(printed([&] { stream.writeAttribute(1, 1); }), "");
-                  EXPECT_EQ(printed([&] { stream.writeAttribute(1, KVString("x")); }), "");
-              }),
-              "");
+    std::string const noScope = "scope: scope not defined!\n";
+    std::string const nothingToEnd = "element: endElement() called without startElement()!\n";
+    auto const start = [](KVXMLWriteStream& stream, unsigned token) {
+        return refusal([&] { stream.startElement(token); });
+    };
+    auto const attribute = [](KVXMLWriteStream& stream, unsigned token, auto value) {
+        return refusal([&] { stream.writeAttribute(token, value); });
+    };
+    struct Row {
+        char const* what;
+        Write write;
+        char const* written;
+    } const rows[] = {
+        {"with no element open",
+         [&](auto& stream) {
+             EXPECT_EQ(refusal([&] { stream.endElement(); }), nothingToEnd);
+             EXPECT_EQ(refusal([&] { stream.writeValue(1); }), nothingToEnd);
+             EXPECT_EQ(refusal([&] { stream.terminateStartTag(); }), nothingToEnd);
+             EXPECT_EQ(refusal([&] { stream.writeValue(KVString("x")); }),
+                       "element: value not within an element body!\n");
+             EXPECT_EQ(attribute(stream, 1, 1), "element: ");
+             EXPECT_EQ(attribute(stream, 1, KVString("x")), "element: ");
+         },
+         ""},
+        {"without a scope, and with a null one",
+         [&](auto& stream) {
+             stream.popScope();
+             EXPECT_EQ(start(stream, kOuter), noScope);
+             stream.pushScope(nullptr);
+             EXPECT_EQ(start(stream, kOuter), noScope);
+             stream.pushScope(scope);
+             stream.startElement(kOuter);
+             stream.popScope();
+             EXPECT_EQ(attribute(stream, 1, 1), "scope: ");
+             stream.popScope();
+             EXPECT_EQ(attribute(stream, 1, 1), "scope: ");
+         },
+         "<outer"},
+        {"names come from the top scope alone",
+         [&](auto& stream) {
+             stream.pushScope(otherScope);
+             stream.startElement(kOuter);
+             EXPECT_EQ(attribute(stream, 1, 1), "attribute: ");
+             stream.popScope();
+             EXPECT_EQ(attribute(stream, 2, KVString("x")), "attribute: ");
+             EXPECT_EQ(attribute(stream, 0, KVString("x")), "attribute: ");
+             stream.writeAttribute(1, 2);
+             stream.endElement();
+         },
+         "<exterior name=\"2\"/>\n"},
+        {"in an empty scope",
+         [&](auto& stream) {
+             stream.pushScope(emptyScope);
+             EXPECT_EQ(start(stream, kOuter), "element: Token not defined in scope (null)!\n");
+         },
+         ""},
+        // Meant: the parent's start tag counts as closed before the scope is looked at. Without a
+        // scope its ">" is never written.
+        {"the parent's tag is closed by an unknown token",
+         [&](auto& stream) {
+             stream.startElement(kOuter);
+             EXPECT_EQ(start(stream, 77), "element: Token not defined in scope outer!\n");
+             stream.endElement();
+         },
+         "<outer>\n</outer>\n"},
+        {"the end of the parent's tag is lost without a scope",
+         [&](auto& stream) {
+             stream.startElement(kOuter);
+             stream.popScope();
+             EXPECT_EQ(start(stream, kLeaf), noScope);
+             stream.writeValue(1);
+             stream.endElement();
+         },
+         "<outer1</outer>\n"},
+    };
+    for (Row const& row : rows) {
+        SCOPED_TRACE(row.what);
+        EXPECT_EQ(body(row.write), row.written);
+    }
 }
 
 TEST(KVXMLWriteStream, TakesLongNamesAndDeepNesting)

@@ -51,6 +51,25 @@ std::string printedBy(Body body)
     return testing::internal::GetCapturedStdout();
 }
 
+/// How a writer refuses what `body` asks for: the exception's kind, and what is printed.
+template <class Body>
+std::string refusal(Body body)
+{
+    std::string kind = "none";
+    std::string const printed = printedBy([&] {
+        try {
+            body();
+        } catch (KVException_ScopeUndefined const&) {
+            kind = "scope";
+        } catch (KVException_NoElementDefined const&) {
+            kind = "element";
+        } catch (KVException_AttributeUndefined const&) {
+            kind = "attribute";
+        }
+    });
+    return kind + ": " + printed;
+}
+
 /// What a getter answers, and what it leaves in a value that was 77.
 template <class T, class Object, class Getter, class... Token>
 std::pair<bool, T> got(Object&& object, Getter getter, Token... token)
