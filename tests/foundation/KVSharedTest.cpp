@@ -65,7 +65,6 @@ TEST(KVShared, CountsFromManyThreads)
         for (std::thread& thread : threads)
             thread.join();
         ASSERT_EQ(alive, 0);
-        threads.clear(); // with what they hold
         ASSERT_EQ(object->retainCount(), 1u);
     }
 }

@@ -3,14 +3,18 @@
 #include <cmath>
 #include <limits>
 
+using std::pair;
+
 namespace {
+
+using ULong = unsigned long long;
 
 template <class T>
 using Limits = std::numeric_limits<T>;
 
 constexpr long long longMax = Limits<long long>::max();
 constexpr long long longMin = Limits<long long>::min();
-constexpr unsigned long long ulongMax = Limits<unsigned long long>::max();
+constexpr ULong ulongMax = Limits<ULong>::max();
 constexpr int intMax = Limits<int>::max();
 constexpr int intMin = Limits<int>::min();
 constexpr unsigned int uintMax = Limits<unsigned int>::max();
@@ -32,8 +36,8 @@ TEST(KVBinaryXMLField, ConvertsToIntegers)
         int int32;
         long long int64;
         unsigned int uint32;
-        unsigned long long uint64;
-        bool signedAnswer = true, unsignedAnswer = true;
+        ULong uint64;
+        bool ok = true, unsignedOk = true;
     } const rows[] = {
         // Integers are cut to the narrower type.
         {Field(-2LL), -2, -2, uintMax - 1, ulongMax - 1},
@@ -57,13 +61,10 @@ TEST(KVBinaryXMLField, ConvertsToIntegers)
     };
     for (Row const& row : rows) {
         SCOPED_TRACE(&row - rows);
-        EXPECT_EQ(got<int>(row.field, &Field::getAsInt32), std::pair(row.signedAnswer, row.int32));
-        EXPECT_EQ(got<long long>(row.field, &Field::getAsInt64),
-                  std::pair(row.signedAnswer, row.int64));
-        EXPECT_EQ(got<unsigned int>(row.field, &Field::getAsUInt32),
-                  std::pair(row.unsignedAnswer, row.uint32));
-        EXPECT_EQ(got<unsigned long long>(row.field, &Field::getAsUInt64),
-                  std::pair(row.unsignedAnswer, row.uint64));
+        EXPECT_EQ(got<int>(row.field, &Field::getAsInt32), pair(row.ok, row.int32));
+        EXPECT_EQ(got<long long>(row.field, &Field::getAsInt64), pair(row.ok, row.int64));
+        EXPECT_EQ(got<unsigned>(row.field, &Field::getAsUInt32), pair(row.unsignedOk, row.uint32));
+        EXPECT_EQ(got<ULong>(row.field, &Field::getAsUInt64), pair(row.unsignedOk, row.uint64));
     }
 }
 
@@ -74,7 +75,7 @@ TEST(KVBinaryXMLField, ConvertsToFloatsAndBool)
         float single;
         double number;
         bool boolean;
-        bool floatAnswer = true, doubleAnswer = true;
+        bool floatOk = true, doubleOk = true;
     } const rows[] = {
         {Field(ulongMax), 0x1p64f, 0x1p64, true},
         {Field(0.1f), 0.1f, static_cast<double>(0.1f), true},
@@ -89,11 +90,9 @@ TEST(KVBinaryXMLField, ConvertsToFloatsAndBool)
     };
     for (Row const& row : rows) {
         SCOPED_TRACE(&row - rows);
-        EXPECT_EQ(got<float>(row.field, &Field::getAsFloat),
-                  std::pair(row.floatAnswer, row.single));
-        EXPECT_EQ(got<double>(row.field, &Field::getAsDouble),
-                  std::pair(row.doubleAnswer, row.number));
-        EXPECT_EQ(got<bool>(row.field, &Field::getAsBool), std::pair(true, row.boolean));
+        EXPECT_EQ(got<float>(row.field, &Field::getAsFloat), pair(row.floatOk, row.single));
+        EXPECT_EQ(got<double>(row.field, &Field::getAsDouble), pair(row.doubleOk, row.number));
+        EXPECT_EQ(got<bool>(row.field, &Field::getAsBool), pair(true, row.boolean));
     }
     EXPECT_TRUE(got<bool>(Field(NAN), &Field::getAsBool).second);
 }

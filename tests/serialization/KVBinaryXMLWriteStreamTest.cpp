@@ -137,17 +137,14 @@ TEST(KVBinaryXMLWriteStream, WritesStringsAndUUIDs)
 
 TEST(KVBinaryXMLWriteStream, WritesVariableLengthNumbers)
 {
-    struct Row {
-        unsigned int value;
-        std::string expected;
-    } const rows[] = {
+    std::pair<unsigned, std::string> const rows[] = {
         {0, "\0"s},           {0x7F, "\x7F"},         {0x80, "\x80\1"},
         {0x3FFF, "\xFF\x7F"}, {0x4000, "\x80\x80\1"}, {0xFFFFFFFFu, "\xFF\xFF\xFF\xFF\x0F"},
     };
-    for (Row const& row : rows) {
+    for (auto const& [value, expected] : rows) {
         KVBufferWriteStream bytes(64, 64);
-        KVBinaryXMLWriteStream::writeVarInt(bytes, row.value);
-        EXPECT_EQ(textOf(bytes), row.expected) << row.value;
+        KVBinaryXMLWriteStream::writeVarInt(bytes, value);
+        EXPECT_EQ(textOf(bytes), expected) << value;
     }
     KVBufferWriteStream bytes(64, 64);
     KVBinaryXMLWriteStream::writeInt(bytes, 1ULL, true); // a magnitude of one has no sign
@@ -290,15 +287,15 @@ TEST(KVBinaryXMLWriteStream, WritesTheExampleOfItsPage)
     KVScope table[] = {
         {"a", 1, 0}, {"b", 1, 2}, {"c", 1, 3}, {"d", 2, 0}, {nullptr, 0, 0},
     };
-    EXPECT_EQ(header + written([&](auto& stream) {
-                  stream.pushScope(table);
-                  stream.startElement(1);
-                  stream.writeAttribute(2, 7);
-                  stream.writeAttribute(3, KVString("b"));
-                  stream.startElement(2);
-                  stream.endElement();
-                  stream.writeValue(0.5f);
-                  stream.endElement();
-              }),
-              expected);
+    std::string const bytes = written([&](auto& stream) {
+        stream.pushScope(table);
+        stream.startElement(1);
+        stream.writeAttribute(2, 7);
+        stream.writeAttribute(3, KVString("b"));
+        stream.startElement(2);
+        stream.endElement();
+        stream.writeValue(0.5f);
+        stream.endElement();
+    });
+    EXPECT_EQ(header + bytes, expected);
 }

@@ -50,17 +50,14 @@ TEST(KVFileWriteStream, AgreesWithAMemoryStream)
 TEST(KVFileWriteStream, SaysWhatWentWrong)
 {
     TemporaryFolder const folder;
-    struct Row {
-        KVURL url;
-        int error;
-    } const rows[] = {
+    std::pair<KVURL, int> const rows[] = {
         {KVURL(), ENOENT},
         {urlOf(folder.path("missing/note.txt")), ENOENT},
         {urlOf(folder.path("")), EISDIR},
     };
-    for (Row const& row : rows) {
-        KVFileWriteStream file(row.url);
-        EXPECT_EQ(file.getError(), row.error);
+    for (auto const& [url, error] : rows) {
+        KVFileWriteStream file(url);
+        EXPECT_EQ(file.getError(), error);
         EXPECT_THROW(file.write("x", 1), KVException_WriteError);
         EXPECT_THROW(file.setPos(0), KVException_WriteError);
         EXPECT_THROW(file.close(), KVException_WriteError);

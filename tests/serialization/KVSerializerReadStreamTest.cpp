@@ -114,35 +114,27 @@ TEST(KVSerializerReadStream, FindsElementsInTheOrderOfPushing)
     }
 }
 
-TEST(KVSerializerReadStream, FindsElementsByToken)
-{
-    Handler handler("h");
-    Frame frame;
-    frame.scope = none;
-    EXPECT_FALSE(frame.find(1u));
-    EXPECT_EQ(frame.scope, none) << "left as it was without a handler";
-    frame.pushHandler(&handler);
-    frame.pushScope(first);
-    EXPECT_EQ(frame.find(1u), first);
-    EXPECT_FALSE(frame.find(3u)) << "that is an attribute's row";
-    EXPECT_FALSE(frame.scope);
-    frame.pushScope(wildcard);
-    EXPECT_EQ(frame.find(12345u), wildcard + 1);
-}
-
 TEST(KVSerializerReadStream, SearchesTheTopHandlersScopesOnly)
 {
     Handler outer("outer"), inner("inner");
     inner.onBegin = [](KVSerializerReadStream& stream) { stream.pushScope(second); };
     Frame frame;
+    frame.scope = none;
+    EXPECT_FALSE(frame.find(1u));
+    EXPECT_EQ(frame.scope, none) << "left as it was without a handler";
     frame.pushHandler(&outer);
     frame.pushScope(first);
+    EXPECT_EQ(frame.find(1u), first);
+    EXPECT_FALSE(frame.find(3u)) << "that is an attribute's row";
+    EXPECT_FALSE(frame.scope);
     frame.pushHandler(&inner);
     EXPECT_FALSE(frame.find("clip"));
     EXPECT_EQ(frame.find("both"), second);
     frame.popHandler();
     EXPECT_TRUE(frame.find("clip"));
     EXPECT_EQ(frame.handler, &outer);
+    frame.pushScope(wildcard);
+    EXPECT_EQ(frame.find(12345u), wildcard + 1);
     frame.ignoreElement();
     EXPECT_EQ(frame.currentHandler(), &KVIgnoreElement::sharedInstance());
     EXPECT_FALSE(frame.find("clip")) << "what is ignored has no scope";

@@ -6,7 +6,11 @@
 #include <cmath>
 #include <random>
 
+using std::pair;
+
 namespace {
+
+using ULong = unsigned long long;
 
 constexpr unsigned kElement = 5;
 
@@ -20,7 +24,7 @@ void append(Element& element, std::string text, bool newline)
     element.appendContentWithNewline(text.data(), newline);
 }
 
-std::unique_ptr<Element> elementWith(std::string const& content)
+std::unique_ptr<Element> with(std::string const& content)
 {
     auto element = std::make_unique<Element>(kElement, scope, nullptr);
     append(*element, content, true);
@@ -43,9 +47,9 @@ TEST(KVXMLStreamElement, ReadsIntegersLikeC)
         int int32;
         unsigned uint32;
         long long int64;
-        unsigned long long uint64;
+        ULong uint64;
         bool boolean;
-        bool signedAnswer = true, unsignedAnswer = true;
+        bool ok = true, unsignedOk = true;
     } const rows[] = {
         {"0", 0, 0, 0, 0, false},
         {" \n+12abc", 12, 12, 12, 12, true},
@@ -59,16 +63,14 @@ TEST(KVXMLStreamElement, ReadsIntegersLikeC)
     };
     for (Row const& row : rows) {
         SCOPED_TRACE(row.text);
-        EXPECT_EQ(got<int>(elementWith(row.text), &Element::getAsInt32),
-                  std::pair(row.signedAnswer, row.int32));
-        EXPECT_EQ(got<long long>(elementWith(row.text), &Element::getAsInt64),
-                  std::pair(row.signedAnswer, row.int64));
-        EXPECT_EQ(got<unsigned>(elementWith(row.text), &Element::getAsUInt32),
-                  std::pair(row.unsignedAnswer, row.uint32));
-        EXPECT_EQ(got<unsigned long long>(elementWith(row.text), &Element::getAsUInt64),
-                  std::pair(row.unsignedAnswer, row.uint64));
-        EXPECT_EQ(got<bool>(elementWith(row.text), &Element::getAsBool),
-                  std::pair(row.unsignedAnswer, row.boolean));
+        EXPECT_EQ(got<int>(with(row.text), &Element::getAsInt32), pair(row.ok, row.int32));
+        EXPECT_EQ(got<long long>(with(row.text), &Element::getAsInt64), pair(row.ok, row.int64));
+        EXPECT_EQ(got<unsigned>(with(row.text), &Element::getAsUInt32),
+                  pair(row.unsignedOk, row.uint32));
+        EXPECT_EQ(got<ULong>(with(row.text), &Element::getAsUInt64),
+                  pair(row.unsignedOk, row.uint64));
+        EXPECT_EQ(got<bool>(with(row.text), &Element::getAsBool),
+                  pair(row.unsignedOk, row.boolean));
     }
 }
 
@@ -93,17 +95,16 @@ TEST(KVXMLStreamElement, ReadsFloatingPointLikeTheCLocale)
         {"abc", true, 0},
     };
     for (Row const& row : rows)
-        EXPECT_EQ(got<double>(elementWith(row.text), &Element::getAsDouble),
-                  std::pair(row.ok, row.value))
+        EXPECT_EQ(got<double>(with(row.text), &Element::getAsDouble), pair(row.ok, row.value))
             << row.text;
-    EXPECT_TRUE(std::isnan(got<double>(elementWith("-nan"), &Element::getAsDouble).second));
+    EXPECT_TRUE(std::isnan(got<double>(with("-nan"), &Element::getAsDouble).second));
     auto const narrow = [](char const* text) {
-        return got<float>(elementWith(text), &Element::getAsFloat);
+        return got<float>(with(text), &Element::getAsFloat);
     };
-    EXPECT_EQ(narrow("1.4e-45"), std::pair(true, 1.4e-45f));
-    EXPECT_EQ(narrow("1e39"), std::pair(false, INFINITY));
+    EXPECT_EQ(narrow("1.4e-45"), pair(true, 1.4e-45f));
+    EXPECT_EQ(narrow("1e39"), pair(false, INFINITY));
     // Half-way between two floats as a double, and not as written.
-    EXPECT_EQ(narrow("16777217.000000001"), std::pair(true, 16777218.0f));
+    EXPECT_EQ(narrow("16777217.000000001"), pair(true, 16777218.0f));
 }
 
 TEST(KVXMLStreamElement, ReadsEveryNumberToTheNearest)
@@ -123,11 +124,9 @@ TEST(KVXMLStreamElement, ReadsEveryNumberToTheNearest)
             std::snprintf(text, sizeof text, "%.*e", digits, value);
         else
             std::snprintf(text, sizeof text, "%.*f", digits, value);
-        ASSERT_EQ(got<double>(elementWith(text), &Element::getAsDouble).second,
-                  std::strtod(text, nullptr))
+        ASSERT_EQ(got<double>(with(text), &Element::getAsDouble).second, std::strtod(text, nullptr))
             << text;
-        ASSERT_EQ(got<float>(elementWith(text), &Element::getAsFloat).second,
-                  std::strtof(text, nullptr))
+        ASSERT_EQ(got<float>(with(text), &Element::getAsFloat).second, std::strtof(text, nullptr))
             << text;
     }
 }
@@ -138,8 +137,8 @@ TEST(KVXMLStreamElement, GivesFalseWithoutText)
         Element element(kElement, scope, nullptr);
         if (empty)
             append(element, "", false);
-        EXPECT_EQ(got<int>(element, &Element::getAsInt32), std::pair(false, 77));
-        EXPECT_EQ(got<double>(element, &Element::getAsDouble), std::pair(false, 77.0));
+        EXPECT_EQ(got<int>(element, &Element::getAsInt32), pair(false, 77));
+        EXPECT_EQ(got<double>(element, &Element::getAsDouble), pair(false, 77.0));
         EXPECT_FALSE(got<bool>(element, &Element::getAsBool).first);
         EXPECT_EQ(element.getAsUUID(), nullptr);
         EXPECT_EQ(stringOf(element), "") << "a string is always there";
@@ -150,11 +149,11 @@ TEST(KVXMLStreamElement, GivesFalseWithoutText)
 
 TEST(KVXMLStreamElement, ReadsListsByItsCursor)
 {
-    auto const list = elementWith(" 1 2.5\n0123456789abcdef0123456789abcdef 3 4 5 6 7end");
+    auto const list = with(" 1 2.5\n0123456789abcdef0123456789abcdef 3 4 5 6 7end");
     Element& element = *list;
     auto const next = [&] { return got<int>(element, &Element::getAsInt32); };
-    EXPECT_EQ(next(), std::pair(true, 1));
-    EXPECT_EQ(got<double>(element, &Element::getAsDouble), std::pair(true, 2.5));
+    EXPECT_EQ(next(), pair(true, 1));
+    EXPECT_EQ(got<double>(element, &Element::getAsDouble), pair(true, 2.5));
     std::unique_ptr<KVUUID> const uuid(element.getAsUUID());
     ASSERT_TRUE(uuid);
     EXPECT_EQ(uuid->words[3], 0x89abcdefu);
@@ -162,15 +161,15 @@ TEST(KVXMLStreamElement, ReadsListsByItsCursor)
     ASSERT_TRUE(element.getAsVexTime(&time));
     EXPECT_EQ(time.value, 3);
     EXPECT_EQ(time.epoch, 6);
-    EXPECT_EQ(next(), std::pair(true, 7));
+    EXPECT_EQ(next(), pair(true, 7));
     EXPECT_EQ(element.getAsUUID(), nullptr) << "and the cursor stays";
     // Text that is no number gives 0 for ever.
     for (int i = 0; i < 3; ++i)
-        EXPECT_EQ(next(), std::pair(true, 0));
+        EXPECT_EQ(next(), pair(true, 0));
     EXPECT_EQ(stringOf(element).front(), ' ') << "a string does not mind the cursor";
     // More text takes the cursor back to the start.
     append(element, "8", true);
-    EXPECT_EQ(next(), std::pair(true, 1));
+    EXPECT_EQ(next(), pair(true, 1));
 }
 
 TEST(KVXMLStreamElement, JoinsPiecesOfText)
@@ -200,7 +199,7 @@ TEST(KVXMLStreamElement, DecodesItsStringAgain)
         {"not UTF-8 \xE9", ""},
     };
     for (Row const& row : rows) {
-        auto const element = elementWith(row.content);
+        auto const element = with(row.content);
         EXPECT_EQ(stringOf(*element), row.string) << row.content;
     }
 }
@@ -213,23 +212,22 @@ TEST(KVXMLStreamElement, ReadsAttributes)
                                   "0.5",       "1 2 3 4"};
     for (unsigned i = 0; i < std::size(values); ++i)
         element.addAttribute(10 + i, values[i]);
-    EXPECT_EQ(got<unsigned>(element, &Element::getAttributeAsUInt32, 10), std::pair(true, 0u))
+    EXPECT_EQ(got<unsigned>(element, &Element::getAttributeAsUInt32, 10), pair(true, 0u))
         << "an empty one is 0";
-    EXPECT_EQ(got<long long>(element, &Element::getAttributeAsInt64, 11),
-              std::pair(false, LLONG_MAX));
-    EXPECT_FALSE(got<unsigned long long>(element, &Element::getAttributeAsUInt64, 11).first);
+    EXPECT_EQ(got<long long>(element, &Element::getAttributeAsInt64, 11), pair(false, LLONG_MAX));
+    EXPECT_FALSE(got<ULong>(element, &Element::getAttributeAsUInt64, 11).first);
     KVString text;
     EXPECT_TRUE(element.getAttributeAsString(12, &text));
     EXPECT_EQ(text.toUTF8(), "a &amp; b") << "nothing is decoded here";
     std::unique_ptr<KVUUID> const uuid(element.getAttributeAsUUID(13));
     EXPECT_EQ(*uuid, (KVUUID{{0x01234567, 0x89abcdef, 0x01234567, 0x89abcdef}}));
-    EXPECT_EQ(got<double>(element, &Element::getAttributeAsDouble, 14), std::pair(true, 0.5));
-    EXPECT_EQ(got<float>(element, &Element::getAttributeAsFloat, 14), std::pair(true, 0.5f));
+    EXPECT_EQ(got<double>(element, &Element::getAttributeAsDouble, 14), pair(true, 0.5));
+    EXPECT_EQ(got<float>(element, &Element::getAttributeAsFloat, 14), pair(true, 0.5f));
     CMTime time;
     EXPECT_TRUE(element.getAttributeAsVexTime(15, &time));
     EXPECT_EQ(time.timescale, 2);
     // Absent.
-    EXPECT_EQ(got<int>(element, &Element::getAttributeAsInt32, 1), std::pair(false, 77));
+    EXPECT_EQ(got<int>(element, &Element::getAttributeAsInt32, 1), pair(false, 77));
     EXPECT_FALSE(got<bool>(element, &Element::getAttributeAsBool, 1).first);
     EXPECT_FALSE(element.getAttributeAsString(1, &text));
     EXPECT_EQ(element.getAttributeAsUUID(1), nullptr);
