@@ -34,12 +34,31 @@ long countUnder(Lock& lock)
     return count;
 }
 
+/// A thread that tries to do something.
+class Waiting {
+public:
+    template <class Body>
+    explicit Waiting(Body body) : thread_([this, body] { body(), through_ = true; })
+    {
+        std::this_thread::sleep_for(5ms);
+    }
+    bool isThrough() const { return through_; }
+    bool getsThrough()
+    {
+        thread_.join();
+        return through_;
+    }
+
+private:
+    std::atomic<bool> through_{false};
+    std::thread thread_;
+};
+
 } // namespace
 
 TEST(Locks, ExcludeEachOther)
 {
-    KVMutex mutex;
-    KVMutex recursive(true);
+    KVMutex mutex, recursive(true);
     KVSpinLock spin;
     KVSharedMutex shared;
     EXPECT_EQ(countUnder(mutex), 16000);
@@ -54,16 +73,10 @@ TEST(KVMutex, IsRecursiveIfAsked)
     mutex.lock();
     mutex.lock();
     mutex.unlock();
-    std::atomic<bool> entered{false};
-    std::thread other([&] {
-        std::scoped_lock const guard(mutex);
-        entered = true;
-    });
-    std::this_thread::sleep_for(5ms);
-    EXPECT_FALSE(entered);
+    Waiting other([&] { std::scoped_lock const guard(mutex); });
+    EXPECT_FALSE(other.isThrough());
     mutex.unlock();
-    other.join();
-    EXPECT_TRUE(entered);
+    EXPECT_TRUE(other.getsThrough());
 }
 
 TEST(KVSpinLock, SleepsThroughALongSection)
@@ -118,16 +131,10 @@ TEST(KVSharedMutex, AWriterMayTakeEitherSideAgain)
     mutex.unlock();
     // At recursion 0 the shared side has nothing to undo, and the lock stays the writer's.
     mutex.unlock_shared();
-    std::atomic<bool> entered{false};
-    std::thread reader([&] {
-        std::shared_lock const guard(mutex);
-        entered = true;
-    });
-    std::this_thread::sleep_for(5ms);
-    EXPECT_FALSE(entered);
+    Waiting reader([&] { std::shared_lock const guard(mutex); });
+    EXPECT_FALSE(reader.isThrough());
     mutex.unlock();
-    reader.join();
-    EXPECT_TRUE(entered);
+    EXPECT_TRUE(reader.getsThrough());
 }
 
 TEST(KVSharedMutex, ReadersShareAndRecurseAndKeepWritersOut)
@@ -135,19 +142,14 @@ TEST(KVSharedMutex, ReadersShareAndRecurseAndKeepWritersOut)
     KVSharedMutex mutex;
     mutex.unlock_shared(); // holds nothing: returns quietly
     mutex.lock_shared();
-    std::atomic<bool> written{false};
     std::thread([&] { std::shared_lock const guard(mutex); }).join();
-    std::thread writer([&] {
-        std::scoped_lock const guard(mutex);
-        written = true;
-    });
-    std::this_thread::sleep_for(5ms);
+    Waiting writer([&] { std::scoped_lock const guard(mutex); });
+    EXPECT_FALSE(writer.isThrough());
     mutex.lock_shared(); // with a writer waiting
     mutex.unlock_shared();
-    EXPECT_FALSE(written);
+    EXPECT_FALSE(writer.isThrough());
     mutex.unlock_shared();
-    writer.join();
-    EXPECT_TRUE(written);
+    EXPECT_TRUE(writer.getsThrough());
 }
 
 TEST(KVThread, RunsWaitsAndKnowsItself)
@@ -258,15 +260,11 @@ TEST(KVSingleton, LowestOrderGoesFirst)
     EXPECT_EQ(deleted, "");
 }
 
-TEST(KVSingleton, WhatADestructorMakesGoesInTheNextPass)
+TEST(KVSingleton, WhatADestructorMakesGoesInTheNextOfSixPasses)
 {
     new Chained(5);
     EXPECT_EQ(deleteAll(), "");
     EXPECT_EQ(deleted, "cccccc");
-}
-
-TEST(KVSingleton, GivesUpAfterSixPasses)
-{
     new Chained(6);
     // Six passes ran and the words say five, joined to the next word: hosts look for just this.
     EXPECT_EQ(

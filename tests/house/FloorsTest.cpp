@@ -1,11 +1,8 @@
 #include "house/Floors.h"
+#include <support/TemporaryFolder.h>
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-
-#include <fstream>
-#include <sstream>
-#include <unistd.h>
 
 namespace fs = std::filesystem;
 using ::testing::ElementsAre;
@@ -17,7 +14,7 @@ namespace {
 /// A made-up library on disk: time and media on foundation, the two sides of platform around it.
 class MadeUpTree : public ::testing::Test {
 protected:
-    MadeUpTree() : root_(fs::temp_directory_path() / ("korvane-floors-" + std::to_string(getpid())))
+    MadeUpTree() : root_(folder_.path(""))
     {
         write("korvane/platform/CFBase.h", "#include <korvane/foundation/KVExport.h>\n");
         write("korvane/platform/NSError.h", "#include <korvane/foundation/KVString.h>\n");
@@ -32,7 +29,6 @@ protected:
         write("korvane/media/KVAtom.h", "  #  include <korvane/platform/CFBase.h>\n");
         write("korvane/korvane.h", "#include <korvane/media/KVAtom.h>\n");
     }
-    ~MadeUpTree() override { fs::remove_all(root_); }
 
     void write(fs::path const& file, char const* text)
     {
@@ -54,6 +50,7 @@ protected:
         return faultsOfTree(root_, Floors::read(lines));
     }
 
+    TemporaryFolder folder_;
     fs::path root_;
 };
 
@@ -65,11 +62,6 @@ TEST(Floors, EveryArrowOfTheLibraryGoesDown)
     Floors const floors = Floors::read(lines);
     ASSERT_GE(floors.below.size(), 3u);
     EXPECT_THAT(faultsOfTree(KORVANE_SOURCE_DIR, floors), IsEmpty());
-}
-
-TEST_F(MadeUpTree, IsSoundToBeginWith)
-{
-    EXPECT_THAT(faults(), IsEmpty());
 }
 
 TEST_F(MadeUpTree, EveryPlantedFaultIsFound)
@@ -91,14 +83,13 @@ TEST_F(MadeUpTree, EveryPlantedFaultIsFound)
          "KVAll.h:1: goes up from media to all: korvane/korvane.h"},
         {"korvane/media/KVText.h", "#include <unicode/ustring.h>\n",
          "KVText.h:1: a public header includes unicode/ustring.h"},
-        {"korvane/media/KVText.h", "# include <libxml/xmlreader.h>\n",
-         "KVText.h:1: a public header includes libxml/xmlreader.h"},
         {"korvane/media/KVText.h", "#include <korvane/foundation/KVLocale_p.h>\n",
          "KVText.h:1: a public header includes the private korvane/foundation/KVLocale_p.h"},
         {"korvane/media/KVText.h", "#include <korvane/media/KVGone.h>\n",
          "KVText.h:1: there is no korvane/media/KVGone.h"},
         {"korvane/media/KVOrphan.cpp", "", "KVOrphan.cpp: no floor names this source"},
     };
+    EXPECT_THAT(faults(), IsEmpty());
     for (Row const& row : rows) {
         write(row.file, row.text);
         EXPECT_THAT(faults(), ElementsAre(HasSubstr(row.fault))) << row.file;

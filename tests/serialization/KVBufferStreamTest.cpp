@@ -1,12 +1,12 @@
 #include "SerializationSupport.h"
 
-#include <climits>
 #include <numeric>
 
 TEST(KVBufferReadStream, ReadsWhatIsLeft)
 {
-    auto const data = KVCFRef<CFDataRef>::adopt(CFDataCreate(nullptr, "abcdef", 6));
+    auto data = KVCFRef<CFDataRef>::adopt(CFDataCreate(nullptr, "abcdef", 6));
     KVBufferReadStream stream(data);
+    data = nullptr; // the stream keeps its block
     char out[8] = {};
     EXPECT_EQ(stream.read(out, 4), 4);
     EXPECT_EQ(stream.read(out + 4, 4), 2);
@@ -19,19 +19,7 @@ TEST(KVBufferReadStream, ReadsWhatIsLeft)
     EXPECT_EQ(stream.write("xyz", 3), 0);
     EXPECT_EQ(stream.getPos(), 2u) << "writing moves nothing";
     EXPECT_EQ(stream.read(out, ~0ull), 4);
-    EXPECT_EQ(stream.getError(), 0);
-
-    KVBufferReadStream none(nullptr);
-    EXPECT_EQ(none.read(out, 1), 0);
-}
-
-TEST(KVBufferReadStream, KeepsItsBlock)
-{
-    auto data = KVCFRef<CFDataRef>::adopt(CFDataCreate(nullptr, "abc", 3));
-    KVBufferReadStream stream(data);
-    data = nullptr;
-    char out[3];
-    EXPECT_EQ(stream.read(out, 3), 3);
+    EXPECT_EQ(KVBufferReadStream(nullptr).read(out, 1), 0);
 }
 
 TEST(KVBufferWriteStream, GrowsWhenAWriteReachesItsEnd)
@@ -40,10 +28,9 @@ TEST(KVBufferWriteStream, GrowsWhenAWriteReachesItsEnd)
     for (int length = 0; length < 40; ++length) {
         std::string text(static_cast<std::size_t>(length), '\0');
         std::iota(text.begin(), text.end(), 'A');
-        KVBufferWriteStream whole(8, 4);
+        KVBufferWriteStream whole(8, 4), bytes(0, 0);
         EXPECT_EQ(whole.write(text.data(), text.size()), length);
         EXPECT_EQ(textOf(whole), text);
-        KVBufferWriteStream bytes(0, 0);
         for (char const& c : text)
             bytes.write(&c, 1);
         EXPECT_EQ(textOf(bytes), text);
@@ -51,12 +38,11 @@ TEST(KVBufferWriteStream, GrowsWhenAWriteReachesItsEnd)
     }
 }
 
-TEST(KVBufferWriteStream, KeepsItsSizeWhenThePositionGoesBack)
+TEST(KVBufferWriteStream, FollowsItsPosition)
 {
     KVBufferWriteStream stream(4, 4);
     stream << "0123456789";
     stream.setPos(3);
-    EXPECT_EQ(stream.getBufferSize(), 10u);
     stream << "ab";
     EXPECT_EQ(stream.getPos(), 5u);
     EXPECT_EQ(textOf(stream), "012ab56789");
@@ -66,20 +52,10 @@ TEST(KVBufferWriteStream, KeepsItsSizeWhenThePositionGoesBack)
     EXPECT_EQ(stream.read(nullptr, 4), 0);
 
     stream.reset();
-    EXPECT_EQ(stream.getBufferSize(), 0u);
-    stream << "new";
-    EXPECT_EQ(textOf(stream), "new");
-}
-
-TEST(KVBufferWriteStream, FillsAGapWithZeros)
-{
-    KVBufferWriteStream stream(64, 4);
-    stream << "dirty memory, to be seen by nobody";
-    stream.reset();
     stream.setPos(5);
     EXPECT_EQ(stream.getBufferSize(), 0u) << "only a write extends the data";
     stream << "x";
-    EXPECT_EQ(textOf(stream), std::string(5, '\0') + "x");
+    EXPECT_EQ(textOf(stream), std::string(5, '\0') + "x") << "and fills the gap with zeros";
 }
 
 TEST(KVBufferWriteStream, CopiesItsData)
@@ -92,8 +68,7 @@ TEST(KVBufferWriteStream, CopiesItsData)
     stream.reset();
     stream << "******";
     EXPECT_EQ(std::string_view(block.get(), 6), "copied");
-    EXPECT_EQ(std::string_view(reinterpret_cast<char const*>(data->bytes()), data->length()),
-              "copied");
+    EXPECT_EQ(data->description().toUTF8(), "<636f7069 6564>");
 }
 
 TEST(KVBufferWriteStream, ThrowsWhatItCannotHold)

@@ -14,20 +14,16 @@ std::string written(Write write)
 
 TEST(KVStream, WritesTextWithoutItsTerminator)
 {
-    EXPECT_EQ(written([](KVStream& s) {
-                  s << "reel"
-                    << "" << nullptr << " " << KVString("12");
-              }),
+    EXPECT_EQ(written([](KVStream& s) { s << "reel" << nullptr << " " << KVString("12"); }),
               "reel 12");
-    EXPECT_EQ(written([](KVStream& s) { s << KVString() << KVString(""); }), "");
+    EXPECT_EQ(written([](KVStream& s) { s << KVString() << KVString("") << ""; }), "");
 }
 
 // Meant: the count of UTF-16 units is taken as a count of bytes.
 TEST(KVStream, CutsTextThatIsNotASCII)
 {
-    EXPECT_EQ(written([](KVStream& s) { s << KVString("Réel"); }), "Ré"
-                                                                   "e");
-    EXPECT_EQ(written([](KVStream& s) { s << KVString("€"); }), "\xE2");
+    EXPECT_EQ(written([](KVStream& s) { s << KVString("Réel") << KVString("€"); }),
+              "R\xC3\xA9\x65\xE2");
 }
 
 // Meant: each block of 20 levels ends with the zero byte behind the constant's 39 blanks.
@@ -38,13 +34,8 @@ TEST(KVStream, IndentsByTwoBlanksWithAZeroInEveryFullBlock)
         unsigned int levels;
         std::string text;
     } const rows[] = {
-        {0, ""},
-        {1, "  "},
-        {19, std::string(38, ' ')},
-        {20, block},
-        {21, block + "  "},
-        {40, block + block},
-        {41, block + block + "  "},
+        {0, ""},     {1, "  "},          {19, std::string(38, ' ')},
+        {20, block}, {21, block + "  "}, {40, block + block},
     };
     for (Row const& row : rows)
         EXPECT_EQ(written([&](KVStream& s) { s.indent(row.levels); }), row.text) << row.levels;

@@ -1,8 +1,5 @@
 #include "SerializationSupport.h"
 
-#include <functional>
-#include <map>
-
 namespace {
 
 enum Token : unsigned { kRoot = 1, kGroup, kLeaf, kValue };
@@ -13,62 +10,28 @@ KVScope scope[] = {
     {"at", kLeaf, 1},    {"value", kValue, 0},  {nullptr, 0, 0},
 };
 
-std::string nameOf(unsigned token)
-{
-    for (KVScope const* row = scope; row->name; ++row)
-        if (row->elementToken == token && row->attributeToken == 0)
-            return row->name;
-    return std::to_string(token);
-}
-
-/// Writes down what it is called with, and becomes the handler of each `vzml` and `group`.
-class Recorder : public KVIgnoreElement {
-public:
-    bool parseBegin(KVSerializerReadStream& stream) override
-    {
-        log += "(";
-        stream.pushScope(table);
-        return true;
-    }
-    bool parseEnd(KVSerializerReadStream& stream) override
-    {
-        KVStreamElement const* const current = stream.currentElement();
-        log += current ? ")" + nameOf(current->token) + " " : ") ";
-        return true;
-    }
-    bool parseElement(KVSerializerReadStream& stream, KVStreamElement& element) override
-    {
-        log += nameOf(element.token);
-        for (unsigned attribute = 1; attribute <= 2; ++attribute) {
-            KVString value;
-            if (stream.getAttributeAsString(element, attribute, &value))
-                log += "@" + std::to_string(attribute) + "=" + value.toUTF8();
-        }
-        KVString text;
-        stream.getAsString(element, &text);
-        if (!text.empty())
-            log += ":" + text.toUTF8();
-        log += " ";
-        if (onElement && onElement(stream, element))
-            return true;
-        return element.token == kRoot || element.token == kGroup ? stream.pushHandler(this) : true;
-    }
-    bool readSignificantWhiteSpace() override { return blanks; }
-
-    std::string log;
-    KVScope* table = scope;
-    bool blanks = false;
-    std::function<bool(KVSerializerReadStream&, KVStreamElement&)> onElement;
+/// Becomes the handler of each `vzml` and `group`.
+struct SceneRecorder : Recorder {
+    SceneRecorder() : Recorder(scope, {kLeaf, kValue, 99}) {}
 };
+
+/// What `body` prints to standard error.
+template <class Body>
+std::string complaintsOf(Body body)
+{
+    testing::internal::CaptureStderr();
+    body();
+    return testing::internal::GetCapturedStderr();
+}
 
 /// What a recorder writes down of a document; " failed" behind it when parse() is false.
 std::string eventsOf(std::string_view document, Recorder& recorder)
 {
     KVXMLReadStream stream(document.data(), static_cast<int>(document.size()));
     stream.pushHandler(&recorder);
-    testing::internal::CaptureStderr();
-    bool const parsed = stream.parse();
-    EXPECT_EQ(testing::internal::GetCapturedStderr(), parsed ? "" : " : parsing error\n");
+    bool parsed = false;
+    std::string const complaints = complaintsOf([&] { parsed = stream.parse(); });
+    EXPECT_EQ(complaints, parsed ? "" : " : parsing error\n");
     EXPECT_EQ(stream.currentHandler(), nullptr);
     EXPECT_EQ(parsed, stream.errorText().empty());
     return recorder.log + (parsed ? "" : "failed");
@@ -76,7 +39,7 @@ std::string eventsOf(std::string_view document, Recorder& recorder)
 
 std::string eventsOf(std::string_view document)
 {
-    Recorder recorder;
+    SceneRecorder recorder;
     return eventsOf(document, recorder);
 }
 
@@ -100,11 +63,9 @@ TEST(KVXMLReadStream, KeepsTheOrderOfEvents)
          "(vzml (group@1=a (leaf )group group ()group leaf )vzml ) "},
         // What nobody names is passed over whole, wherever it stands.
         {"<vzml><other><leaf/></other><leaf/></vzml>", "(vzml (leaf )vzml ) "},
-        {"<vzml><other/><leaf/><other/></vzml>", "(vzml (leaf )vzml ) "},
         {"<vzml><leaf/><other><x/></other></vzml>", "(vzml (leaf )vzml ) "},
         {"<vzml><other/><other/><group><other><leaf/></other></group></vzml>",
          "(vzml (group ()group )vzml ) "},
-        {"<other><leaf/></other>", "() "},
         {"<vzml><leaf other='1' at='2' also='3'/></vzml>", "(vzml (leaf@1=2 )vzml ) "},
         // An attribute of another element does not answer; each element has its own.
         {"<vzml><leaf version='1' name='n'/><group at='1'/></vzml>",
@@ -112,6 +73,10 @@ TEST(KVXMLReadStream, KeepsTheOrderOfEvents)
         // A child of an element whose handler has not changed goes to the same handler.
         {"<vzml><leaf>a<value>b</value>c</leaf></vzml>", "(vzml (leaf:a value:b )vzml ) "},
         {"<p:vzml xmlns:p='u'/>", "() "},
+        // The parser overwrites the values of attributes with entities.
+        {"<!DOCTYPE vzml [<!ENTITY a 'first'><!ENTITY b 'the second one'>]>"
+         "<vzml><leaf at='&a;.' name='&b;.'><value/></leaf></vzml>",
+         "(vzml (leaf@1=first.@2=the second one. value )vzml ) "},
     };
     for (Row const& row : rows)
         EXPECT_EQ(eventsOf(row.document), row.events) << row.document;
@@ -119,118 +84,93 @@ TEST(KVXMLReadStream, KeepsTheOrderOfEvents)
 
 TEST(KVXMLReadStream, GathersText)
 {
+    constexpr char plain[] = "";
+    constexpr char type[] = "<!DOCTYPE vzml [<!ENTITY space 'x'><!ENTITY other 'y'>"
+                            "<!ENTITY apos '&#39;'><!ENTITY amp '&#38;#38;'>]>";
     struct Row {
+        std::string before;
         char const* content;
         char const* text; // of the leaf
         bool blanks = false;
     } const rows[] = {
-        {"plain", ":plain"},
-        {" spaced\nlines ", ": spaced\nlines "},
-        {"a &amp; b &#233;", ":a & b é"},
+        {plain, " spaced\nlines ", ": spaced\nlines "},
+        {plain, "a &amp; b &#233;", ":a & b é"},
         // What the parser leaves escaped is replaced once more, "&amp;" first.
-        {"&amp;lt;&amp;amp;gt;&amp;quot;&amp;apos;", ":<>\"&apos;"},
-        {"ab<!-- -->cd", ":ab\ncd"},
-        {"ab<?pi?>cd<!-- -->ef", ":ab\ncd\nef"},
-        {"ab<![CDATA[lost]]>cd", ":ab\ncd"},
-        {"<![CDATA[lost]]>", ""},
-        {"   ", ""},
-        {"   ", ":   ", true},
-        {"\n<!-- -->\t", ":\n\n\t", true},
+        {plain, "&amp;lt;&amp;amp;gt;&amp;quot;&amp;apos;", ":<>\"&apos;"},
+        {plain, "ab<?pi?>cd<!-- -->ef", ":ab\ncd\nef"},
+        {plain, "ab<![CDATA[lost]]>cd", ":ab\ncd"},
+        {plain, "<![CDATA[lost]]>", ""},
+        {plain, "   ", ":   ", true},
+        {plain, "\n<!-- -->\t", ":\n\n\t", true},
+        // Entities are joined with their text.
+        {type, "a&space;b", ":a b"},
+        {type, "&other;", ""},
+        {type, "a&space;b<!-- -->c", ":a b\nc"},
+        {type, "a&apos;b&amp;c", ":a'b&c"},
     };
     for (Row const& row : rows) {
-        Recorder recorder;
+        SceneRecorder recorder;
         recorder.blanks = row.blanks;
-        std::string const document = std::string("<vzml><leaf>") + row.content + "</leaf></vzml>";
-        EXPECT_EQ(eventsOf(document, recorder), std::string("(vzml (leaf") + row.text + " )vzml ) ")
-            << row.content;
-    }
-}
-
-TEST(KVXMLReadStream, JoinsEntitiesWithTheirText)
-{
-    constexpr char type[] = "<!DOCTYPE vzml [<!ENTITY space 'x'><!ENTITY other 'y'>"
-                            "<!ENTITY apos '&#39;'><!ENTITY amp '&#38;#38;'>]>";
-    struct Row {
-        char const* content;
-        char const* text;
-    } const rows[] = {
-        {"a&space;b", ":a b"},
-        {"a&other;b", ":ab"},
-        {"&space;", ": "},
-        {"&other;", ""},
-        {"a&space;b<!-- -->c", ":a b\nc"},
-        {"a&apos;b&amp;c", ":a'b&c"},
-    };
-    for (Row const& row : rows)
-        EXPECT_EQ(eventsOf(std::string(type) + "<vzml><leaf>" + row.content + "</leaf></vzml>"),
+        EXPECT_EQ(eventsOf(row.before + "<vzml><leaf>" + row.content + "</leaf></vzml>", recorder),
                   std::string("(vzml (leaf") + row.text + " )vzml ) ")
             << row.content;
+    }
     EXPECT_EQ(eventsOf(std::string(type) + "<vzml><leaf at='a&other;b&space;c&#233;'/></vzml>"),
               "(vzml (leaf@1=aybxcé )vzml ) ");
 }
 
-TEST(KVXMLReadStream, KeepsAttributesThatTheParserOverwrites)
-{
-    constexpr char document[] = "<!DOCTYPE vzml [<!ENTITY a 'first'><!ENTITY b 'the second one'>]>"
-                                "<vzml><leaf at='&a;.' name='&b;.'><value/></leaf></vzml>";
-    EXPECT_EQ(eventsOf(document), "(vzml (leaf@1=first.@2=the second one. value )vzml ) ");
-}
-
 TEST(KVXMLReadStream, IgnoresAnElement)
 {
-    Recorder recorder;
-    recorder.onElement = [](KVSerializerReadStream& stream, KVStreamElement& element) {
+    Recorder recorder(scope, {kGroup, kLeaf});
+    recorder.onElement = [](auto& stream, KVStreamElement& element) {
         if (element.token == kGroup)
             stream.ignoreElement();
-        return element.token == kGroup;
     };
     EXPECT_EQ(
         eventsOf("<vzml><group><leaf/><group><leaf/></group></group><leaf/></vzml>", recorder),
         "(vzml (group leaf )vzml ) ");
 }
 
-TEST(KVXMLReadStream, GivesAWildcardEveryElement)
+TEST(KVXMLReadStream, FindsRowsByTheNamesOfTheTable)
 {
     KVScope any[] = {{"leaf", kLeaf, 0}, {"*", 99, 0}, {"name", 99, 1}, {nullptr, 0, 0}};
-    Recorder recorder;
-    recorder.table = any;
-    EXPECT_EQ(eventsOf("<vzml name='x'><leaf/><p:q xmlns:p='u'/></vzml>", recorder),
-              "(99@1=x leaf 99 ) ");
-}
-
-TEST(KVXMLReadStream, GivesAnAttributeToAllItsRows)
-{
     KVScope twice[] = {{"vzml", kRoot, 0}, {"n", kRoot, 1},    {"n", kLeaf, 7}, {"m", kRoot, 8},
                        {"n", kRoot, 2},    {"leaf", kLeaf, 0}, {nullptr, 0, 0}};
-    Recorder recorder;
-    recorder.table = twice;
-    EXPECT_EQ(eventsOf("<vzml n='x' m='y'/>", recorder), "(vzml@1=x@2=x ()vzml ) ");
-}
-
-TEST(KVXMLReadStream, FindsNamespacesAsAttributes)
-{
-    KVScope table[] = {
+    KVScope prefixed[] = {
         {"p:vzml", kRoot, 0}, {"xmlns:p", kRoot, 1}, {"p:a", kRoot, 2}, {nullptr, 0, 0}};
-    Recorder recorder;
-    recorder.table = table;
-    EXPECT_EQ(eventsOf("<p:vzml xmlns:p='uri' p:a='b'/>", recorder), "(vzml@1=uri@2=b ()vzml ) ");
+    struct Row {
+        char const* what;
+        KVScope* table;
+        char const* document;
+        char const* events;
+    } const rows[] = {
+        {"a wildcard takes every element", any, "<vzml name='x'><leaf/><p:q xmlns:p='u'/></vzml>",
+         "(*@1=x leaf * ) "},
+        {"an attribute goes to all its rows", twice, "<vzml n='x' m='y'/>",
+         "(vzml@1=x@2=x ()vzml ) "},
+        {"a namespace is an attribute", prefixed, "<p:vzml xmlns:p='uri' p:a='b'/>",
+         "(p:vzml@1=uri@2=b ()p:vzml ) "},
+    };
+    for (Row const& row : rows) {
+        SceneRecorder recorder;
+        recorder.table = row.table;
+        EXPECT_EQ(eventsOf(row.document, recorder), row.events) << row.what;
+    }
 }
 
 TEST(KVXMLReadStream, StopsAndAborts)
 {
     constexpr char document[] = "<vzml><group><leaf/><leaf/></group><leaf/></vzml>";
     for (bool const abort : {false, true}) {
-        Recorder recorder;
-        recorder.onElement = [abort](KVSerializerReadStream& stream, KVStreamElement& element) {
+        SceneRecorder recorder;
+        recorder.onElement = [abort](auto& stream, KVStreamElement& element) {
             if (element.token == kLeaf)
                 abort ? stream.abortParse() : stream.stopParse();
-            return false;
         };
         KVXMLReadStream stream(document, sizeof document - 1);
         stream.pushHandler(&recorder);
-        testing::internal::CaptureStderr();
-        EXPECT_EQ(stream.parse(), !abort);
-        EXPECT_EQ(testing::internal::GetCapturedStderr(), abort ? " : parsing error\n" : "");
+        EXPECT_EQ(complaintsOf([&] { EXPECT_EQ(stream.parse(), !abort); }),
+                  abort ? " : parsing error\n" : "");
         EXPECT_EQ(recorder.log, "(vzml (group (leaf )group )group )group ")
             << "parseEnd on all handlers, with the elements still open";
     }
@@ -241,24 +181,18 @@ TEST(KVXMLReadStream, ReadsFromAllItsSources)
     constexpr char document[] = "<vzml version='1.0'><leaf/></vzml>";
     constexpr char events[] = "(vzml@1=1.0 (leaf )vzml ) ";
     TemporaryFolder const folder;
-    std::string const path = folder.file("my scene.vzml");
-    writeFile(path, document);
-    {
-        KVXMLReadStream stream(urlOf(path));
-        Recorder recorder;
-        stream.pushHandler(&recorder);
-        EXPECT_TRUE(stream.parse());
-        EXPECT_EQ(recorder.log, events);
-        EXPECT_TRUE(stream.getURL() == urlOf(path));
-    }
+    KVURL const url = urlOf(folder.write("my scene.vzml", document));
     auto data = KVCFRef<CFDataRef>::adopt(CFDataCreate(nullptr, document, sizeof document - 1));
-    KVXMLReadStream stream(data.get());
-    data = nullptr;
-    Recorder recorder;
-    stream.pushHandler(&recorder);
-    EXPECT_TRUE(stream.parse());
-    EXPECT_EQ(recorder.log, events);
-    EXPECT_TRUE(stream.getURL().isNull());
+    KVXMLReadStream fromFile(url), fromData(data.get());
+    data = nullptr; // the stream keeps it
+    for (KVXMLReadStream* const stream : {&fromFile, &fromData}) {
+        SceneRecorder recorder;
+        stream->pushHandler(&recorder);
+        EXPECT_TRUE(stream->parse());
+        EXPECT_EQ(recorder.log, events);
+    }
+    EXPECT_TRUE(fromFile.getURL() == url);
+    EXPECT_TRUE(fromData.getURL().isNull());
 }
 
 TEST(KVXMLReadStream, SaysNothingWhenThereIsNothingToRead)
@@ -266,19 +200,17 @@ TEST(KVXMLReadStream, SaysNothingWhenThereIsNothingToRead)
     TemporaryFolder const folder;
     std::function<std::unique_ptr<KVXMLReadStream>()> const sources[] = {
         [] { return std::make_unique<KVXMLReadStream>(KVURL()); },
-        [&] { return std::make_unique<KVXMLReadStream>(urlOf(folder.file("missing"))); },
-        [&] { return std::make_unique<KVXMLReadStream>(urlOf(folder.file(""))); },
+        [&] { return std::make_unique<KVXMLReadStream>(urlOf(folder.path("missing"))); },
+        [&] { return std::make_unique<KVXMLReadStream>(urlOf(folder.path(""))); },
         [] { return std::make_unique<KVXMLReadStream>(nullptr, 5); },
         [] { return std::make_unique<KVXMLReadStream>("<a/>", -1); },
         [] { return std::make_unique<KVXMLReadStream>(static_cast<CFDataRef>(nullptr)); },
     };
     for (auto const& source : sources) {
         auto const stream = source();
-        Recorder recorder;
+        SceneRecorder recorder;
         stream->pushHandler(&recorder);
-        testing::internal::CaptureStderr();
-        EXPECT_FALSE(stream->parse());
-        EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
+        EXPECT_EQ(complaintsOf([&] { EXPECT_FALSE(stream->parse()); }), "");
         EXPECT_EQ(recorder.log, "() ") << "handlers are popped all the same";
         stream->processNode();
     }
@@ -287,12 +219,8 @@ TEST(KVXMLReadStream, SaysNothingWhenThereIsNothingToRead)
 TEST(KVXMLReadStream, NamesTheFileOfAParsingError)
 {
     TemporaryFolder const folder;
-    std::string const path = folder.file("broken.vzml");
-    writeFile(path, "<vzml>\n\n<leaf></vzml>");
-    KVXMLReadStream stream(urlOf(path));
-    testing::internal::CaptureStderr();
-    EXPECT_FALSE(stream.parse());
-    EXPECT_EQ(testing::internal::GetCapturedStderr(), "broken.vzml : parsing error\n");
+    KVXMLReadStream stream(urlOf(folder.write("broken.vzml", "<vzml>\n\n<leaf></vzml>")));
+    EXPECT_EQ(complaintsOf([&] { EXPECT_FALSE(stream.parse()); }), "broken.vzml : parsing error\n");
     EXPECT_EQ(stream.errorLine(), 3u);
     EXPECT_NE(stream.errorText().toUTF8().find("leaf"), std::string::npos);
 }
@@ -307,15 +235,11 @@ TEST(KVXMLReadStream, RefusesWhatIsNotWellFormed)
         EXPECT_FALSE(parses(whole.substr(0, length))) << "cut at " << length;
     for (char const* const document : {
              "<vzml></group>",
-             "<vzml/><vzml/>",
              "<vzml version='1' version='2'/>",
-             "<vzml version=1/>",
              "<vzml>&unknown;</vzml>",
-             "<vzml>\x01</vzml>",
              "<vzml>caf\xE9</vzml>",                                            // Latin-1
              "<?xml version='1.0' encoding='UTF-8'?><vzml>\xED\xA0\x80</vzml>", // a surrogate
              "<?xml version='1.0' encoding='no-such'?><vzml/>",
-             "no markup",
              " <?xml version='1.0'?><vzml/>",
          })
         EXPECT_FALSE(parses(document)) << document;
@@ -363,7 +287,6 @@ TEST(KVXMLReadStream, RefusesEntityBombs)
              nested + "]><vzml><leaf>&e9;</leaf></vzml>",
              encoded + useInAttribute,
              std::string("<!DOCTYPE v [<!ENTITY a 'x&#38;b;'><!ENTITY b 'y'>]><vzml>&a;</vzml>"),
-             std::string("<!DOCTYPE v [<!ENTITY a '&a;'>]><vzml version='&a;'/>"),
              std::string("<!DOCTYPE v [<!ENTITY % a '<!ENTITY b \"c\">'> %a;]><vzml/>"),
              std::string("<!DOCTYPE v [<!-- '\" ]> --><!ENTITY % a ''>]><vzml/>"),
              std::string("<?p ?><!DOCTYPE v SYSTEM 'a>[' [<?p ]>?><!ENTITY % a ''>]><vzml/>"),
@@ -394,15 +317,6 @@ TEST(KVXMLReadStream, LooksForTheRootInAMegabyte)
     std::string const comment = "<!-- " + std::string(700000, 'x') + " -->";
     EXPECT_TRUE(parses(comment + "<vzml/>"));
     EXPECT_FALSE(parses(comment + comment + "<vzml/>"));
-    TemporaryFolder const folder;
-    for (bool const twice : {false, true}) {
-        std::string const path = folder.file("long.vzml");
-        writeFile(path, comment + (twice ? comment : "") + "<vzml/>");
-        KVXMLReadStream stream(urlOf(path));
-        testing::internal::CaptureStderr();
-        EXPECT_EQ(stream.parse(), !twice);
-        testing::internal::GetCapturedStderr();
-    }
 }
 
 TEST(KVXMLReadStream, ReadsDeepAndLongDocuments)
@@ -415,8 +329,7 @@ TEST(KVXMLReadStream, ReadsDeepAndLongDocuments)
     for (int i = 0; i < depth; ++i)
         document += "</group>";
     document += "</vzml>";
-    Recorder recorder;
-    std::string const events = eventsOf(document, recorder);
+    std::string const events = eventsOf(document);
     EXPECT_EQ(std::count(events.begin(), events.end(), '('), depth + 2);
     EXPECT_EQ(events.find("failed"), std::string::npos);
     EXPECT_FALSE(parses(document.substr(0, document.size() / 2)));
@@ -425,7 +338,7 @@ TEST(KVXMLReadStream, ReadsDeepAndLongDocuments)
 TEST(KVXMLReadStream, BoundsMarkupAndNotText)
 {
     std::string const much(8'000'000, 'v');
-    Recorder recorder;
+    SceneRecorder recorder;
     std::string const read =
         eventsOf("<vzml><leaf at='" + much + "'>" + much + much + "</leaf></vzml>", recorder);
     EXPECT_EQ(read.size(), 3 * much.size() + std::string("(vzml (leaf@1=: )vzml ) ").size());
@@ -469,21 +382,19 @@ TEST(KVXMLReadStream, TakesElementsFromAnArenaOf16)
     std::vector<KVStreamElement*> elements;
     for (unsigned i = 0; i < 20; ++i)
         elements.push_back(stream.createElement(i, scope, nullptr));
-    auto const distance = [&](std::size_t a, std::size_t b) {
-        return reinterpret_cast<char*>(elements[b]) - reinterpret_cast<char*>(elements[a]);
-    };
     for (std::size_t i = 1; i < 16; ++i)
-        EXPECT_EQ(distance(i - 1, i), distance(0, 1)) << "one behind the other";
+        EXPECT_EQ(reinterpret_cast<char*>(elements[i]) - reinterpret_cast<char*>(elements[i - 1]),
+                  reinterpret_cast<char*>(elements[1]) - reinterpret_cast<char*>(elements[0]))
+            << "one behind the other";
     while (elements.size() > 15) {
         stream.destroyElement(elements.back());
         elements.pop_back();
     }
     // A place that is taken out of turn is not taken twice.
     stream.destroyElement(elements[3]);
-    KVStreamElement* const sixteenth = stream.createElement(99, scope, nullptr);
+    elements[3] = stream.createElement(99, scope, nullptr);
     EXPECT_EQ(elements[14]->token, 14u);
-    EXPECT_EQ(sixteenth->token, 99u);
-    elements[3] = sixteenth;
+    EXPECT_EQ(elements[3]->token, 99u);
     for (KVStreamElement* const element : elements)
         stream.destroyElement(element);
     stream.destroyElement(nullptr);
@@ -499,7 +410,8 @@ TEST(KVXMLReadStream, TellsItsObserverWhatIsUnknown)
         void unknownAttribute(KVStreamElement const& element, char const* name,
                               unsigned long line) override
         {
-            log += std::to_string(line) + ":" + nameOf(element.token) + "." + name + " ";
+            log += std::to_string(line) + ":" + SceneRecorder().nameOf(element.token) + "." + name +
+                   " ";
         }
         std::string log;
     };
@@ -510,7 +422,7 @@ TEST(KVXMLReadStream, TellsItsObserverWhatIsUnknown)
     KVXMLReadStream stream(document.data(), static_cast<int>(document.size()));
     Observer observer;
     stream.setObserver(&observer);
-    Recorder recorder;
+    SceneRecorder recorder;
     stream.pushHandler(&recorder);
     EXPECT_TRUE(stream.parse());
     EXPECT_EQ(observer.log, "2:other 4:leaf.xmlns:p 4:leaf.bad 4:leaf.p:q 70004:more "

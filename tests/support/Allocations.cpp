@@ -11,7 +11,7 @@ namespace {
 std::atomic<long> made{0};
 std::atomic<long> untilFailure{0};
 std::atomic<std::size_t> largest{0};
-std::atomic<long> held{0};
+std::atomic<long> heldNow{0};
 std::atomic<long> mostHeld{0};
 long heldAtStart = 0;
 
@@ -34,8 +34,13 @@ long allocations::peak() noexcept
 
 void allocations::startPeak() noexcept
 {
-    heldAtStart = held;
+    heldAtStart = heldNow;
     mostHeld = heldAtStart;
+}
+
+long allocations::held() noexcept
+{
+    return heldNow - heldAtStart;
 }
 
 void allocations::failAt(long number) noexcept
@@ -52,14 +57,14 @@ void* operator new(std::size_t size)
     void* const block = std::malloc(size ? size : 1);
     if (!block)
         throw std::bad_alloc();
-    held += static_cast<long>(::malloc_usable_size(block));
-    mostHeld = std::max(mostHeld.load(), held.load());
+    heldNow += static_cast<long>(::malloc_usable_size(block));
+    mostHeld = std::max(mostHeld.load(), heldNow.load());
     return block;
 }
 
 void operator delete(void* block) noexcept
 {
-    held -= static_cast<long>(::malloc_usable_size(block));
+    heldNow -= static_cast<long>(::malloc_usable_size(block));
     std::free(block);
 }
 

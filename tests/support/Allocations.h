@@ -14,6 +14,8 @@ std::size_t takeLargest() noexcept;
 /// held then.
 long peak() noexcept;
 void startPeak() noexcept;
+/// The bytes held now beyond what was held then.
+long held() noexcept;
 /// Lets the `number`th allocation from now throw std::bad_alloc, 1 being the next; 0 lets none.
 void failAt(long number) noexcept;
 
