@@ -86,22 +86,17 @@ TEST(KVCachedFunctionImpl, PlainReferencesAreRetainedWhileTheirResultIsKept)
 
 TEST(KVCachedFunctionImpl, ThreadsComputeEachResidentKeyOnce)
 {
-    constexpr int keys = 50;
     // Plain counters: the memoiser's lock is all that orders these writes.
-    std::array<int, keys> calls{};
-    KVCachedFunctionImpl<int, int> square(
-        [&](int value) {
-            ++calls[static_cast<std::size_t>(value)];
-            return value * value;
-        },
-        keys);
+    std::array<int, 50> calls{};
+    KVCachedFunctionImpl<int, std::size_t> square(
+        [&](std::size_t value) { return ++calls[value], static_cast<int>(value * value); }, 50);
     std::array<int, 4> wrong{};
     std::vector<std::thread> threads;
     for (std::size_t t = 0; t < wrong.size(); ++t)
         threads.emplace_back([&, t] {
-            for (int i = 0; i < 5000; ++i) {
-                int const value = (i * 7 + static_cast<int>(t) * 13) % keys;
-                wrong[t] += square(value) != value * value;
+            for (std::size_t i = 0; i < 5000; ++i) {
+                std::size_t const value = (i * 7 + t * 13) % calls.size();
+                wrong[t] += square(value) != static_cast<int>(value * value);
             }
         });
     for (auto& thread : threads)

@@ -304,9 +304,9 @@ TEST(KVAtomMetadataHandler, IntegersAreReadAsFarAsTheyGo)
     }
 }
 
-TEST(KVAtomMetadataHandler, SphericalAtomsOfTheSecondGenerationAreWritten)
+TEST(KVAtomMetadataHandler, SectionsAreWrittenAsAtoms)
 {
-    auto const written = [](std::string const& source, std::string const& projection) {
+    auto const v2 = [](std::string const& source, std::string const& projection) {
         return atom("st3d", be32(0) + '\0') +
                atom("sv3d", atom("svhd", be32(0) + source + '\0') +
                                 atom("proj", atom("prhd", be64(0) + be64(0)) + projection));
@@ -314,71 +314,51 @@ TEST(KVAtomMetadataHandler, SphericalAtomsOfTheSecondGenerationAreWritten)
     std::string const brovo = "Brovo Vantor", longest(251, 's'), tooLong(252, 's');
     std::string const equi = atom("equi", be32(0) + be32(5) + be32(0) + be64(0));
     std::string const cbmp = atom("cbmp", be32(0) + be32(0) + be32(6));
+    char const* const kV2 = kKVGoogleV2Metadata;
+    char const* const kStd = kKVStandardExtensionsMetadata;
     struct Row {
-        char const* name;
+        char const* key;
         std::vector<std::pair<char const*, std::string>> values;
         std::string extensions;
     } const rows[] = {
-        {"anything", {{"x", "1"}}, written(brovo, "")},
-        {"source", {{"metadata_source", "ü"}}, written("ü", "")},
-        {"longest source", {{"metadata_source", longest}}, written(longest, "")},
-        {"source too long", {{"metadata_source", tooLong}}, written(brovo, "")},
-        {"bounds", {{"projection_bounds_top", "5"}}, written(brovo, equi)},
-        {"cube", {{"cube_layout", "x"}, {"cube_padding", "6"}}, written(brovo, cbmp)},
-        {"both", {{"cube_layout", "1"}, {"projection_bounds_top", "5"}}, written(brovo, equi)},
+        {kV2, {{"x", "1"}}, v2(brovo, "")},
+        {kV2, {{"metadata_source", "ü"}}, v2("ü", "")},
+        {kV2, {{"metadata_source", longest}}, v2(longest, "")},
+        {kV2, {{"metadata_source", tooLong}}, v2(brovo, "")},
+        {kV2, {{"projection_bounds_top", "5"}}, v2(brovo, equi)},
+        {kV2, {{"cube_layout", "x"}, {"cube_padding", "6"}}, v2(brovo, cbmp)},
+        {kV2, {{"cube_layout", "1"}, {"projection_bounds_top", "5"}}, v2(brovo, equi)},
+        // Both are written, whatever is given.
+        {kKVHDRMetadata,
+         {{"white_point_x", "65537"}},
+         atom("mdcv", std::string(12, '\0') + be16(1) + be16(0) + be64(0)) + atom("clli", be32(0))},
+        // Meant: not the layout that is read. These need all of their numbers.
+        {kStd,
+         {{"color_primaries", "9"}, {"color_transfer", "16"}, {"color_matrix", "9"}},
+         atom("colr", fromHex("0009 0000 0000 0010 0009"))},
+        {kStd, {{"color_primaries", "9"}, {"color_transfer", "0"}, {"color_matrix", "9"}}, ""},
+        {kStd, {{"field_fields", "2"}, {"field_detail", "14"}}, atom("fiel", fromHex("020E"))},
+        {kStd, {{"field_fields", "2"}}, ""},
+        {kStd, {{"pixel_aspect_h", "4"}, {"pixel_aspect_v", "3"}}, atom("pasp", be32(4) + be32(3))},
+        {kStd, {{"pixel_aspect_h", "4"}, {"pixel_aspect_v", "-3"}}, ""},
     };
     for (Row const& row : rows) {
-        auto const values = makeDictionary({});
-        for (auto const& [key, text] : row.values)
-            values->setValue(key, KVString(text).cf_str());
         Session session(makeMovie({}));
-        session.set(kKVGoogleV2Metadata, values);
-        EXPECT_EQ(toHex(session.writeExtensions()), toHex(row.extensions)) << row.name;
+        session.set(row.key, makeDictionary(row.values));
+        EXPECT_EQ(toHex(session.writeExtensions()), toHex(row.extensions)) << row.values[0].first;
     }
+    Session hdr(makeMovie({})), noStrings(makeMovie({}));
+    hdr.set(kKVHDRMetadata, mastering());
+    EXPECT_EQ(
+        toHex(hdr.writeExtensions()),
+        toHex(atom("mdcv", fromHex("2134 9BAA 1996 08FC 8A48 3908 3D13 4042 00989680 00000032")) +
+              atom("clli", fromHex("03E8 0190"))));
     // What is no string counts as 0, as a key it is there.
     auto const values = makeDictionary({});
     values->setValue("projection_bounds_top", makeData("x"));
-    values->setValue("metadata_source", makeData("x"));
-    Session session(makeMovie({}));
-    session.set(kKVGoogleV2Metadata, values);
-    EXPECT_EQ(toHex(session.writeExtensions()),
-              toHex(written(brovo, atom("equi", be32(0) + be64(0) + be64(0)))));
-}
-
-TEST(KVAtomMetadataHandler, HDRAtomsAreBothWrittenWhateverIsGiven)
-{
-    Session session(makeMovie({}));
-    session.set(kKVHDRMetadata, mastering());
-    EXPECT_EQ(
-        toHex(session.writeExtensions()),
-        toHex(atom("mdcv", fromHex("2134 9BAA 1996 08FC 8A48 3908 3D13 4042 00989680 00000032")) +
-              atom("clli", fromHex("03E8 0190"))));
-    Session single(makeMovie({}));
-    single.set(kKVHDRMetadata, makeDictionary({{"white_point_x", "65537"}}));
-    EXPECT_EQ(toHex(single.writeExtensions()),
-              toHex(atom("mdcv", std::string(12, '\0') + be16(1) + be16(0) + be64(0)) +
-                    atom("clli", be32(0))));
-}
-
-TEST(KVAtomMetadataHandler, StandardExtensionsNeedAllTheirNumbers)
-{
-    struct Row {
-        std::initializer_list<std::pair<char const*, std::string>> values;
-        std::string extensions;
-    } const rows[] = {
-        {{{"color_primaries", "9"}, {"color_transfer", "16"}, {"color_matrix", "9"}},
-         atom("colr", fromHex("0009 0000 0000 0010 0009"))}, // meant: not the layout that is read
-        {{{"color_primaries", "9"}, {"color_transfer", "0"}, {"color_matrix", "9"}}, ""},
-        {{{"field_fields", "2"}, {"field_detail", "14"}}, atom("fiel", fromHex("020E"))},
-        {{{"field_fields", "2"}}, ""},
-        {{{"pixel_aspect_h", "4"}, {"pixel_aspect_v", "3"}}, atom("pasp", be32(4) + be32(3))},
-        {{{"pixel_aspect_h", "4"}, {"pixel_aspect_v", "-3"}}, ""},
-    };
-    for (Row const& row : rows) {
-        Session session(makeMovie({}));
-        session.set(kKVStandardExtensionsMetadata, makeDictionary(row.values));
-        EXPECT_EQ(toHex(session.writeExtensions()), toHex(row.extensions));
-    }
+    noStrings.set(kV2, values);
+    EXPECT_EQ(toHex(noStrings.writeExtensions()),
+              toHex(v2(brovo, atom("equi", be32(0) + be64(0) + be64(0)))));
 }
 
 TEST(KVAtomMetadataHandler, TheFirstGenerationIsWrittenAsXML)

@@ -209,7 +209,7 @@ std::string bytesOf(CFDataRef data)
 }
 
 KVCFRef<CFMutableDictionaryRef>
-makeDictionary(std::initializer_list<std::pair<char const*, std::string>> entries)
+makeDictionary(std::vector<std::pair<char const*, std::string>> const& entries)
 {
     auto dictionary = KVCFRef<CFMutableDictionaryRef>::adopt(new __CFDictionary());
     for (auto const& [key, text] : entries)

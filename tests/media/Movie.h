@@ -87,7 +87,7 @@ KVCFRef<CFDataRef> makeData(std::string_view bytes);
 std::string bytesOf(CFDataRef data);
 /// Keys and strings.
 KVCFRef<CFMutableDictionaryRef>
-makeDictionary(std::initializer_list<std::pair<char const*, std::string>> entries);
+makeDictionary(std::vector<std::pair<char const*, std::string>> const& entries);
 /// A dictionary on one line, in its order: {a:"1" b:{c:"2"}}; data in hexadecimal, null as "null".
 std::string show(NSObject const* value);
 /// The tree of an atom on one line: moov(mvhd trak(tkhd)). A type of 0 is "0".
