@@ -53,11 +53,10 @@ TEST(KVCacheImpl, LeastRecentlyUsedEntryLeavesFirst)
         char const* steps;
         char const* kept;
     } const rows[] = {
-        {2, "abAc", "ac"},                     // a hit makes it the newest
-        {2, "abc", "bc"},   {2, "abac", "ac"}, // so does adding it again
+        {2, "abc", "bc"},   {2, "abAc", "ac"}, // a hit makes it the newest
+        {2, "abac", "ac"},                     // so does adding it again
         {2, "abAXc", "ac"},                    // a miss touches nothing
         {0, "aA", ""},                         // evicted in the same call
-        {1, "ab", "b"},     {3, "abcABd", "abd"}, {unbounded, "abcdef", "abcdef"},
     };
     for (auto const& row : rows) {
         KVCacheImpl<char, int> cache(row.maxEntries);
@@ -73,41 +72,6 @@ TEST(KVCacheImpl, LeastRecentlyUsedEntryLeavesFirst)
     }
 }
 
-TEST(KVCacheImpl, MissAnswersADefaultValue)
-{
-    KVCacheImpl<int, int> cache(0);
-    cache.addValue(1, 7, 0);
-    bool found = true;
-    EXPECT_EQ(cache.findValue(1, found), 0);
-    EXPECT_FALSE(found);
-}
-
-TEST(KVCacheImpl, CostBoundsEvictByAgeAndRefuseTheTooDear)
-{
-    KVCacheImpl<char, int> cache;
-    EXPECT_EQ(cache.maxCost(), unbounded);
-    cache.setMaxCost(10);
-    cache.addValue('a', 1, 1);
-    cache.addValue('b', 2, 8);
-    cache.addValue('c', 3, 2); // 11: the cheap old one goes, not the dear new one
-    EXPECT_EQ(keys(cache), "bc");
-    EXPECT_EQ(cache.totalCost(), 10u);
-
-    std::uint64_t const clock = cache.clock();
-    cache.addValue('b', 9, 11); // refused before it is looked up: value and age stay
-    EXPECT_EQ(cache.entries().at('b').value, 2);
-    EXPECT_EQ(cache.clock(), clock);
-
-    cache.addValue('b', 9, 8); // the same cost only touches
-    EXPECT_EQ(cache.totalCost(), 10u);
-    cache.addValue('b', 9, 9); // dearer: the others go, it goes last
-    EXPECT_EQ(keys(cache), "b");
-    EXPECT_EQ(cache.totalCost(), 9u);
-    cache.addValue('b', 9, 3); // cheaper
-    EXPECT_EQ(cache.totalCost(), 3u);
-    EXPECT_EQ(faults(cache), "");
-}
-
 TEST(KVCacheImpl, NothingIsDearerThanNoBound)
 {
     KVCacheImpl<char, int> cache;
@@ -115,23 +79,6 @@ TEST(KVCacheImpl, NothingIsDearerThanNoBound)
     cache.addValue('b', 1, 2); // the sum wraps to 1, which is in bounds
     EXPECT_EQ(keys(cache), "ab");
     EXPECT_EQ(cache.totalCost(), 1u);
-}
-
-TEST(KVCacheImpl, HoldKeepsEverything)
-{
-    KVCacheImpl<char, int> cache(1);
-    cache.setMaxCost(5);
-    cache.setEvictionHold(1);
-    cache.addValue('a', 1, 6);
-    cache.addValue('b', 1, 1);
-    cache.addValue('b', 1, 4);
-    cache.evictIfNecessary();
-    EXPECT_EQ(keys(cache), "ab");
-    cache.setEvictionHold(0);
-    EXPECT_EQ(keys(cache), "ab"); // releasing the hold alone evicts nothing
-    cache.evictIfNecessary();
-    EXPECT_EQ(keys(cache), "b");
-    EXPECT_EQ(cache.totalCost(), 4u);
 }
 
 /// The same cache by plain search: entries from the oldest to the newest.
@@ -213,7 +160,8 @@ TEST(KVCacheImpl, BehavesAsASimpleModelUnderRandomOperations)
         auto const below = [&](unsigned int limit) { return static_cast<int>(random() % limit); };
         Model model;
         model.maxEntries = random() % 40;
-        model.maxCost = seed % 2 ? 100 : unbounded;
+        constexpr std::uint64_t bounds[] = {unbounded, 100, 8}; // costs go up to 11
+        model.maxCost = bounds[seed % 3];
         KVCacheImpl<int, int> cache(model.maxEntries);
         cache.setMaxCost(model.maxCost);
         for (int step = 0; step < 2000; ++step) {
@@ -309,18 +257,12 @@ TEST(KVCacheImpl, EachOperationHoldsTheLockOnce)
 TEST(KVCache, KeepsItsEntriesAlive)
 {
     auto const value = std::make_shared<int>(1);
-    {
-        KVCache<int, std::shared_ptr<int>> cache(1);
-        EXPECT_EQ(cache->maxEntries(), 1u);
-        EXPECT_EQ(cache->maxCost(), unbounded);
-        cache->addValue(1, value, 0);
-        EXPECT_EQ(value.use_count(), 2);
-        KVCache<int, std::shared_ptr<int>> const moved(std::move(cache));
-        bool found = false;
-        EXPECT_EQ(moved->findValue(1, found), value);
-        moved->addValue(2, nullptr, 0);
-        EXPECT_EQ(value.use_count(), 1);
-    }
+    KVCache<int, std::shared_ptr<int>> cache(1);
+    cache->addValue(1, value, 0);
+    KVCache<int, std::shared_ptr<int>> const moved(std::move(cache));
+    EXPECT_EQ(value.use_count(), 2);
+    moved->addValue(2, nullptr, 0);
+    EXPECT_EQ(value.use_count(), 1);
 }
 
 } // namespace

@@ -21,7 +21,6 @@ struct Fixture {
         for (std::uint64_t const time : times)
             heap.add(stamps.insert({static_cast<char>('a' + stamps.size()), {time, 99}}).first);
     }
-    Stamps::iterator at(char name) { return stamps.find(name); }
     /// The array's entries in order; "?" marks one whose stored position is wrong.
     std::string layout() const
     {
@@ -37,15 +36,9 @@ struct Fixture {
     Heap heap;
 };
 
-TEST(KVEvictionHeap, AddLetsTheEntryRisePastYoungerParents)
+TEST(KVEvictionHeap, KeepsTheOldestOnTop)
 {
-    EXPECT_EQ(Fixture({1, 2, 3, 4}).layout(), "abcd");
-    EXPECT_EQ(Fixture({4, 3, 2, 1}).layout(), "dcba");
-    EXPECT_EQ(Fixture({5, 5, 5}).layout(), "abc"); // equal timestamps stop the climb
-}
-
-TEST(KVEvictionHeap, BubbleSinksTowardsTheOlderChild)
-{
+    constexpr std::uint64_t removed = 0;
     struct Row {
         std::vector<std::uint64_t> times;
         char changed;
@@ -55,36 +48,20 @@ TEST(KVEvictionHeap, BubbleSinksTowardsTheOlderChild)
         {{1, 2, 3, 4, 5}, 'a', 9, "bdcae"}, // left child older, and its left child again
         {{1, 3, 2, 4, 5}, 'a', 9, "cbade"}, // right child older
         {{1, 2, 2, 4, 5}, 'a', 9, "bdcae"}, // equal children: the left one
-        {{1, 2, 5, 4, 6}, 'a', 3, "bacde"}, // only the left one is older
-        {{1, 5, 2, 6, 7}, 'a', 3, "cbade"}, // only the right one is older
         {{1, 2, 3, 4, 5}, 'a', 2, "abcde"}, // equal is not older
         {{2, 3, 4, 5, 6}, 'e', 1, "eacdb"}, // nothing to sink past, so it rises
         {{2, 3, 4, 5, 6}, 'e', 3, "abcde"}, // rising stops at an equal parent
+        {{1}, 'a', removed, ""},
+        {{1, 2, 3}, 'c', removed, "ab"},     // the last one itself
+        {{1, 2, 3, 4}, 'a', removed, "bdc"}, // the last one takes its place and sinks
+        {{1, 10, 2, 11, 12, 3, 4}, 'd', removed, "agcbef"}, // or rises
     };
     for (auto const& row : rows) {
         Fixture fixture(row.times);
-        fixture.at(row.changed)->second.timestamp = row.time;
-        fixture.heap.bubble(fixture.at(row.changed));
+        auto const entry = fixture.stamps.find(row.changed);
+        entry->second.timestamp = row.time == removed ? entry->second.timestamp : row.time;
+        row.time == removed ? fixture.heap.remove(entry) : fixture.heap.bubble(entry);
         EXPECT_EQ(fixture.layout(), row.layout) << row.changed << " at " << row.time;
-    }
-}
-
-TEST(KVEvictionHeap, RemoveFillsThePlaceWithTheLastEntry)
-{
-    struct Row {
-        std::vector<std::uint64_t> times;
-        char removed;
-        char const* layout;
-    } const rows[] = {
-        {{1}, 'a', ""},
-        {{1, 2, 3}, 'c', "ab"},                    // the last one itself
-        {{1, 2, 3, 4}, 'a', "bdc"},                // the filler sinks
-        {{1, 10, 2, 11, 12, 3, 4}, 'd', "agcbef"}, // the filler rises
-    };
-    for (auto const& row : rows) {
-        Fixture fixture(row.times);
-        fixture.heap.remove(fixture.at(row.removed));
-        EXPECT_EQ(fixture.layout(), row.layout) << row.removed;
     }
 }
 

@@ -2,10 +2,9 @@
 
 #include <gtest/gtest.h>
 
+#include <support/TemporaryFolder.h>
+
 #include <cerrno>
-#include <filesystem>
-#include <fstream>
-#include <iterator>
 #include <limits>
 
 namespace {
@@ -28,27 +27,19 @@ std::string exported(KVCaptionArray const& captions, bool tags = false, CMTime f
 
 // --- Blocks ---
 
-TEST(SRTExport, WritesNumberedBlocksWithALineBetween)
-{
-    EXPECT_EQ(exported({captionOf("A\nB"), captionOf("naïve 😀", rangeOf(3, 4))}),
-              "1\n00:00:01,000 --> 00:00:02,000\nA\nB\n"
-              "\n"
-              "2\n00:00:03,000 --> 00:00:04,000\nnaïve 😀\n");
-    EXPECT_EQ(exported({}), "");
-}
-
-TEST(SRTExport, LeavesOutWhatHasNoTextAndCutsOneNewline)
+TEST(SRTExport, WritesNumberedBlocksOfWhatHasTextAndCutsOneNewline)
 {
     std::string const one = "1\n00:00:01,000 --> 00:00:02,000\nA\n";
+    std::string const two = "\n2\n00:00:03,000 --> 00:00:04,000\nnaïve 😀\n";
     struct Row {
         KVCaptionArray captions;
         std::string text;
     } const rows[] = {
-        {{captionOf("A"), captionOf("")}, one},
+        {{}, ""},
+        {{captionOf("A"), captionOf("naïve 😀", rangeOf(3, 4))}, one + two},
         {{captionOf(""), captionOf("A")}, one},
         {{captionOf("\n"), captionOf("A"), nullptr, captionOf("\u2028")}, one},
-        {{KVMakeRef<KVCaption>(nullptr, rangeOf(0, 1)), captionOf("A")}, one},
-        {{captionOf("A\n")}, one},
+        {{KVMakeRef<KVCaption>(nullptr, rangeOf(0, 1)), captionOf("A\n")}, one},
         {{captionOf("A\u0085")}, one},
         {{captionOf("A\n\n")}, "1\n00:00:01,000 --> 00:00:02,000\nA\n\n"},
         {{captionOf("A\r\n")}, "1\n00:00:01,000 --> 00:00:02,000\nA\r\n"},
@@ -61,31 +52,25 @@ TEST(SRTExport, LeavesOutWhatHasNoTextAndCutsOneNewline)
 
 TEST(SRTExport, TimesAreMovedAndRaisedToFrames)
 {
+    CMTime const ntsc = CMTimeMake(1001, 24000);
     struct Row {
         CMTimeRange range;
         CMTime frame;
-        CMTime offset;
+        long long offset; // in seconds
         char const* times;
     } const rows[] = {
-        {rangeOf(3600, 3601), CMTimeMake(1, 25), CMTimeMake(-3600, 1),
-         "00:00:00,000 --> 00:00:01,000"},
-        {{CMTimeMake(1, 1000), CMTimeMake(1, 1)},
-         CMTimeMake(1, 25),
-         kCMTimeZero,
-         "00:00:00,040 --> 00:00:01,040"},
-        {{CMTimeMake(1001, 24000), CMTimeMake(1001, 24000)},
-         CMTimeMake(1001, 24000),
-         kCMTimeZero,
-         "00:00:00,041 --> 00:00:00,083"},
-        {rangeOf(1, 2), milliseconds, CMTimeMake(-5, 1), "00:00:00,000 --> 00:00:00,000"},
-        {kCMTimeRangeInvalid, milliseconds, kCMTimeZero, "00:00:00,000 --> 00:00:00,000"},
+        {rangeOf(3600, 3601), CMTimeMake(1, 25), -3600, "00:00:00,000 --> 00:00:01,000"},
+        {{milliseconds, CMTimeMake(1, 1)}, CMTimeMake(1, 25), 0, "00:00:00,040 --> 00:00:01,040"},
+        {{ntsc, ntsc}, ntsc, 0, "00:00:00,041 --> 00:00:00,083"},
+        {rangeOf(1, 2), milliseconds, -5, "00:00:00,000 --> 00:00:00,000"},
+        {kCMTimeRangeInvalid, milliseconds, 0, "00:00:00,000 --> 00:00:00,000"},
         // Without a grid times stay as they are.
-        {rangeOf(1, 2), kCMTimeInvalid, kCMTimeZero, "00:00:01,000 --> 00:00:02,000"},
+        {rangeOf(1, 2), kCMTimeInvalid, 0, "00:00:01,000 --> 00:00:02,000"},
     };
-    for (Row const& row : rows) {
-        EXPECT_EQ(exported({captionOf("A", row.range)}, false, row.frame, row.offset),
-                  "1\n" + std::string(row.times) + "\nA\n");
-    }
+    for (Row const& row : rows)
+        EXPECT_EQ(
+            exported({captionOf("A", row.range)}, false, row.frame, CMTimeMake(row.offset, 1)),
+            "1\n" + std::string(row.times) + "\nA\n");
 }
 
 TEST(KVTimecodeString, HasTwoDigitsOrMoreAndCutsMilliseconds)
@@ -97,7 +82,6 @@ TEST(KVTimecodeString, HasTwoDigitsOrMoreAndCutsMilliseconds)
         {0, "00:00:00,000"},
         {3725.5, "01:02:05,500"},
         {4.35, "00:00:04,350"}, // 4.35 - 4 is a little less than .35
-        {59.9995, "00:00:59,999"},
         {59.9999999999, "00:00:59,999"},
         {360000, "100:00:00,000"},
         {-1, "00:00:00,000"},
@@ -148,23 +132,18 @@ TEST(SRTTaggedText, TagsOpenAndCloseWithTheirAttributes)
         char const* text;
     } const rows[] = {
         {u"", ""},
-        {u"ab", "ab"},
         {u"a*b*c", "a<b>b</b>c"},
         {u"*/_ab", "<b><i><u>ab</u></i></b>"},
         // In the order of the attributes, not of nesting.
         {u"*a/b*c/d", "<b>a<i>b</b>c</i>d"},
         {u"*a1b*c", "<b>a<font color=\"#010000\">b</b>c</font>"},
         {u"1a2b", "<font color=\"#010000\">a</font><font color=\"#020000\">b</font>"},
-        {u"1a0b", "<font color=\"#010000\">a</font>b"},
         {u"*1a", "<b><font color=\"#010000\">a</b></font>"},
         // The first unit of a cluster decides: none is torn.
         {u"e*\u0301x*y", "e\u0301<b>x</b>y"},
-        {u"*e*\u0301y", "<b>e\u0301</b>y"},
         {u"a\xD83D*\xDE00*b", "a😀b"},
         {u"👨\u200D*👩*x", "👨\u200D👩x"},
         {u"🇬*🇧*🇫*🇷*", "🇬🇧🇫🇷"},
-        {u"\r*\n*x", "\r\nx"},
-        {u"가*나", "가<b>나</b>"},
         {u"\u1100*\u1161*x", "\u1100\u1161x"},
     };
     for (Row const& row : rows) {
@@ -184,22 +163,15 @@ TEST(SRTTaggedText, WithoutAFontTraitsStayAsTheyAre)
 
 TEST(SRTTaggedText, ComponentsAreRoundedAndClamped)
 {
-    struct Row {
-        double component;
-        char const* digits;
-    } const rows[] = {
-        {0.5, "80"},
-        {1.0 / 255, "01"},
-        {-3, "00"},
-        {7, "ff"},
-        {std::numeric_limits<double>::quiet_NaN(), "00"},
-    };
-    for (Row const& row : rows) {
+    constexpr double notANumber = std::numeric_limits<double>::quiet_NaN();
+    for (auto const& [red, green, text] :
+         {std::tuple(0.5, 1.0 / 255, "#8001"), std::tuple(-3.0, 7.0, "#00ff"),
+          std::tuple(notANumber, 0.0, "#0000")}) {
         auto const string = KVMakeRef<NSMutableAttributedString>(KVString("a"));
-        string->addAttribute(NSForegroundColorAttributeName,
-                             KVMakeRef<NSColor>(row.component, 0, 0, 1), {0, 1});
+        string->addAttribute(NSForegroundColorAttributeName, KVMakeRef<NSColor>(red, green, 0, 1),
+                             {0, 1});
         EXPECT_EQ(KVSRTCaptionsExporter::_taggedTextFromCaptionString(string).toUTF8(),
-                  "<font color=\"#" + std::string(row.digits) + "0000\">a</font>");
+                  "<font color=\"" + std::string(text) + "00\">a</font>");
     }
 }
 
@@ -207,17 +179,17 @@ TEST(SRTTaggedText, ComponentsAreRoundedAndClamped)
 
 TEST(SRTExport, HalfASurrogatePairIsNotWritten)
 {
+    TemporaryFolder const folder;
+    std::string const path = folder.path("out.srt");
     for (std::u16string_view text : {u"a\xD83D", u"\xDE00 b", u"\xDE00\xD83D"}) {
-        std::string const path = std::filesystem::temp_directory_path() / "korvane-surrogate.srt";
-        std::filesystem::remove(path);
         auto const error = KVSRTCaptionsExporter::exportCaptionsToURL(
             KVURL(path.c_str()), {captionOf("fine"), captionOf(KVString::fromUTF16(text))},
             milliseconds, kCMTimeZero, true);
         ASSERT_TRUE(error);
         EXPECT_EQ(error->domain().toUTF8(), "QFSRTCaptionsExporterError");
         EXPECT_EQ(error->code(), 0);
-        EXPECT_TRUE(error->userInfo(NSLocalizedDescriptionKey));
-        EXPECT_TRUE(error->userInfo(NSLocalizedFailureReasonErrorKey));
+        for (char const* key : {NSLocalizedDescriptionKey, NSLocalizedFailureReasonErrorKey})
+            EXPECT_TRUE(error->userInfo(key)) << key;
         EXPECT_FALSE(std::filesystem::exists(path));
     }
 }
@@ -239,19 +211,17 @@ TEST(SRTExport, TheSystemsErrorIsAnswered)
 
 TEST(SRTExport, AnImportOfAnExportIsTheSame)
 {
-    // Overlapping tags, a second script, a line break, text that looks like a tag's end, several
-    // lines.
+    // Overlapping tags, a second script, a line break, several lines.
     auto const importer = KVMakeRef<KVSRTCaptionsImporter>();
     KVCaptionArray captions;
-    long long second = 0;
     for (char const* text : {"plain", "<b>b<i>bi</b>i</i>", "<u>Ελλάδα</u> 😀\nsecond line", "a > b",
-                             "<font color=\"#12ab34\">green</font>", "{i}mixed</i> {x}"}) {
+                             "<font color=\"#12ab34\">green</font>"}) {
+        auto const second = static_cast<long long>(captions.size());
         captions.push_back(KVMakeRef<KVCaptionSRT>(importer->_parseTagsInString(text),
                                                    rangeOf(second, second + 1)));
-        ++second;
     }
-    std::string const path = std::filesystem::temp_directory_path() / "korvane-round-trip.srt";
-    KVURL const url(path.c_str());
+    TemporaryFolder const folder;
+    KVURL const url(folder.path("a.srt").c_str());
     CMTime const frame = CMTimeMake(1, 25);
     ASSERT_FALSE(
         KVSRTCaptionsExporter::exportCaptionsToURL(url, captions, frame, kCMTimeZero, true));
@@ -261,7 +231,6 @@ TEST(SRTExport, AnImportOfAnExportIsTheSame)
     ASSERT_EQ(back.size(), captions.size());
     for (std::size_t i = 0; i < back.size(); ++i)
         EXPECT_TRUE(back[i][0]->isEqual(captions[i])) << captions[i]->text().toUTF8();
-    std::filesystem::remove(path);
 
     // What does not come back: a bracket in the text takes the tag behind it for its own end.
     auto const open = importer->_parseTagsInString("a < b");

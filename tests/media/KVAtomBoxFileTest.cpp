@@ -27,7 +27,7 @@ public:
     KVAtomBoxFile& operator*() { return *file_; }
 
 private:
-    Folder folder_;
+    TemporaryFolder folder_;
     std::unique_ptr<KVAtomBoxFile> file_ = std::make_unique<KVAtomBoxFile>();
 };
 
@@ -54,7 +54,7 @@ TEST(KVAtomBoxFile, ErrorCodesFollowErrno)
 
 TEST(KVAtomBoxFile, OpeningGivesTheStatedCodes)
 {
-    Folder const folder;
+    TemporaryFolder const folder;
     std::string const movie = folder.write("movie", atom("free"));
     ASSERT_EQ(mkfifo(folder.path("pipe").c_str(), 0600), 0);
     ASSERT_EQ(chmod(folder.write("secret", atom("free")).c_str(), 0), 0);
@@ -65,8 +65,6 @@ TEST(KVAtomBoxFile, OpeningGivesTheStatedCodes)
     } const rows[] = {
         {movie, 0},
         {folder.path("missing"), -2},
-        {folder.path("missing/movie"), -2},
-        {movie + "/movie", -1},
         {folder.path("."), -1},
         {folder.path("pipe"), -1},
         {folder.write("empty", ""), -1},
@@ -84,34 +82,13 @@ TEST(KVAtomBoxFile, OpeningGivesTheStatedCodes)
 
 TEST(KVAtomBoxFile, AnotherInputForgetsTheFirst)
 {
-    Folder const folder;
-    KVAtomBoxFile file;
-    ASSERT_EQ(open(file, folder.write("a", atom("ftyp", "qt  ") + atom("mdat"))), 0);
-    EXPECT_EQ(file.getFileType(), KVAtomType("qt  "));
-    EXPECT_EQ(file.openInputFile(nullptr), -1);
-    EXPECT_EQ(show(file), "0(ftyp mdat)") << "a null URL changes nothing";
-
-    ASSERT_EQ(open(file, folder.write("b", atom("ftyp", "isom") + atom("free", "12"))), 0);
-    EXPECT_EQ(show(file), "0");
-    EXPECT_EQ(file.getFileType(), KVAtomType("isom"));
-    EXPECT_EQ(open(file, folder.path("missing")), -2);
-    EXPECT_EQ(show(file), "0");
-    EXPECT_EQ(file.getFileType(), 0u);
-}
-
-TEST(KVAtomBoxFile, TheRootIsTheFile)
-{
-    Opened file(atom("free", "1234") + atom("mdat"));
-    EXPECT_EQ(file->getTopAtomBox(), &*file);
-    EXPECT_EQ(file->getSize(), 20u);
-    EXPECT_EQ(file->getPayloadSize(), 20u);
-    EXPECT_EQ(file->getOffset(), 0u);
-    EXPECT_EQ(file->getType(), 0u);
-    EXPECT_FALSE(file->getParent());
-    EXPECT_EQ(file->getWritePercentDone(), 0.0);
-    file->closeInputFile();
-    EXPECT_EQ(file->readTopLevelAtomBoxHeaders(), -1);
-    EXPECT_EQ(KVAtomBoxFile().getWritePercentDone(), 0.0);
+    Opened file(atom("ftyp", "qt  ") + atom("mdat"));
+    EXPECT_EQ(file->getFileType(), KVAtomType("qt  "));
+    EXPECT_EQ(file->openInputFile(nullptr), -1);
+    EXPECT_EQ(show(*file), "0(ftyp mdat)") << "a null URL changes nothing";
+    EXPECT_EQ(open(*file, "/none/movie"), -2);
+    EXPECT_EQ(show(*file), "0");
+    EXPECT_EQ(file->getFileType(), 0u);
 }
 
 TEST(KVAtomBoxFile, HeadersAreReadByTheRulesOfSizes)
@@ -122,25 +99,19 @@ TEST(KVAtomBoxFile, HeadersAreReadByTheRulesOfSizes)
         int code;
         std::uint64_t size, payloadSize;
     } const rows[] = {
-        {"00000008", 8, 0, 8, 0},
         {"00000008", 7, -1, 0, 0},
         {"00000014", 20, 0, 20, 12},
         {"00000014", 19, -1, 0, 0},
-        {"00000000", 8, 0, 8, 0},
         {"00000000", 100, 0, 100, 92},
-        {"00000002", 100, -1, 0, 0},
         {"00000007", 100, -1, 0, 0},
         {"FFFFFFFF", 0xFFFFFFFF, 0, 0xFFFFFFFF, 0xFFFFFFF7},
         {"FFFFFFFF", 0xFFFFFFFE, -1, 0, 0},
         {"00000001 0000000000000010", 16, 0, 16, 0},
         {"00000001 0000000000000010", 15, -1, 0, 0},
-        {"00000001 0000000000000018", 100, 0, 24, 8},
         // Below 16 the payload size wraps, and is refused.
         {"00000001 000000000000000F", 100, -1, 0, 0},
-        {"00000001 0000000000000000", 100, -1, 0, 0},
         {"00000001 8000000000000000", 0x8000000000000000, 0, 0x8000000000000000,
          0x7FFFFFFFFFFFFFF0},
-        {"00000001 FFFFFFFFFFFFFFFF", 100, -1, 0, 0},
         {"00000001", 100, -1, 0, 0}, // the file ends before the 64-bit size
     };
     for (Row const& row : rows) {
@@ -156,11 +127,6 @@ TEST(KVAtomBoxFile, HeadersAreReadByTheRulesOfSizes)
     }
     unsigned long long size = 0;
     EXPECT_EQ(KVAtomBoxFile().readAtomBoxHeader(nullptr, &size, nullptr, 100), -1) << "no input";
-    Opened two(atom("free") + atom("skip", "1"));
-    EXPECT_EQ(two->readAtomBoxHeader(nullptr, nullptr, nullptr, 100), 0);
-    EXPECT_EQ(two->readAtomBoxHeader(nullptr, &size, nullptr, 100), 0)
-        << "goes on behind the first";
-    EXPECT_EQ(size, 9u);
 }
 
 TEST(KVAtomBoxFile, TheFirstUnreadableHeaderEndsAParentQuietly)
@@ -187,23 +153,6 @@ TEST(KVAtomBoxFile, TheFirstUnreadableHeaderEndsAParentQuietly)
     }
 }
 
-TEST(KVAtomBoxFile, ReadingChildrenReplacesWhatWasThere)
-{
-    Opened file(atom("free") + longAtom("moov", atom("mvhd", "1") + atom("trak")));
-    ASSERT_EQ(file->readTopLevelAtomBoxHeaders(), 0);
-    KVAtomBox* const moov = file->getChild(1);
-    ASSERT_EQ(file->readChildAtomBoxHeaders(moov), 0);
-    EXPECT_EQ(show(*file), "0(free moov(mvhd trak))");
-    EXPECT_EQ(moov->getChild(1)->getOffset(), 8u + 16u + 9u);
-    EXPECT_EQ(moov->getChild(1)->getParent(), moov);
-    moov->setPayloadData(makeData("x"));
-    ASSERT_EQ(file->readChildAtomBoxHeaders(moov), 0);
-    EXPECT_EQ(show(*moov), "moov(mvhd trak)");
-    EXPECT_FALSE(moov->getPayloadData());
-    EXPECT_EQ(file->readChildAtomBoxHeaders(nullptr), -1);
-    EXPECT_EQ(KVAtomBoxFile().readChildAtomBoxHeaders(moov), -1);
-}
-
 TEST(KVAtomBoxFile, ATreeMayBeAsDeepAsTheFileAllows)
 {
     constexpr int kDepth = 100'000;
@@ -216,7 +165,7 @@ TEST(KVAtomBoxFile, ATreeMayBeAsDeepAsTheFileAllows)
         ASSERT_EQ(file->readChildAtomBoxHeaders(node), 0);
     EXPECT_EQ(depth, kDepth + 1);
 
-    Folder const folder;
+    TemporaryFolder const folder;
     ASSERT_EQ(file->openOutputFile(KVURL(folder.path("out").c_str()).cf_url()), 0);
     EXPECT_EQ(file->writeAtomBoxFileWithUpdates(), 0);
     EXPECT_TRUE(fileBytes(folder.path("out")) == bytes);
@@ -230,8 +179,6 @@ TEST(KVAtomBoxFile, PayloadsLieInTheirParentAndInTheFile)
     ASSERT_EQ(file->readChildAtomBoxHeaders(moov), 0);
     KVAtomBox* const name = moov->getChild(0);
     auto const data = emptyData();
-    EXPECT_EQ(file->readAtomBoxPayload(name, data), 0);
-    EXPECT_EQ(bytesOf(data), "abcdef");
     name->setPayloadData(makeData("changed"));
     EXPECT_EQ(file->readAtomBoxPayload(name, data), 0);
     EXPECT_EQ(bytesOf(data), "abcdef") << "from the file, whatever is in memory";
@@ -257,13 +204,11 @@ TEST(KVAtomBoxFile, PayloadsLieInTheirParentAndInTheFile)
 
 TEST(KVAtomBoxFile, TheFileTypeIsTheFirstValidBrand)
 {
-    for (char const* brand : {"avc1", "iso2", "iso3", "iso4", "iso5", "iso6", "isom", "mp41",
-                              "mp42", "M4A ", "M4V ", "qt  "})
-        EXPECT_TRUE(KVAtomBoxFile::isValidType(static_cast<unsigned int>(numberAt(brand, 0, 4))));
-    for (char const* brand : {"iso1", "iso7", "M4B ", "mov ", "QT  "})
-        EXPECT_FALSE(KVAtomBoxFile::isValidType(static_cast<unsigned int>(numberAt(brand, 0, 4))));
-    EXPECT_FALSE(KVAtomBoxFile::isValidType(0));
-
+    std::string const valid = "avc1 iso2 iso3 iso4 iso5 iso6 isom mp41 mp42 M4A  M4V  qt  ";
+    for (std::size_t at = 0; at < valid.size(); at += 5)
+        EXPECT_TRUE(KVAtomBoxFile::isValidType(static_cast<unsigned>(numberAt(valid, at, 4))));
+    for (char const* brand : {"iso1", "iso7", "M4B ", "QT  "})
+        EXPECT_FALSE(KVAtomBoxFile::isValidType(static_cast<unsigned>(numberAt(brand, 0, 4))));
     struct Row {
         char const* name;
         std::string bytes;
@@ -275,7 +220,6 @@ TEST(KVAtomBoxFile, TheFileTypeIsTheFirstValidBrand)
         {"the minor version is no brand", atom("ftyp", "abcdisom"), "abcd", false},
         {"a word cut short is none", atom("ftyp", "abcd" + be32(0) + "iso"), "abcd", false},
         {"none valid", atom("ftyp", "abcd" + be32(0) + "efgh"), "abcd", false},
-        {"only a brand", atom("ftyp", "qt  "), "qt  ", true},
         {"too short", atom("ftyp", "qt "), be32(0), false},
         {"no ftyp", atom("moov"), be32(0), false},
         {"not at the top", atom("moov", atom("ftyp", "isom")), be32(0), false},
@@ -295,7 +239,7 @@ TEST(KVAtomBoxFile, TracksAreReadDownToTheirTables)
     ASSERT_EQ(file->readAllTrackMediaAtomBoxes(), 0);
     EXPECT_EQ(show(*file), "0(ftyp moov(mvhd trak(tkhd edts mdia(mdhd hdlr minf(vmhd dinf stbl("
                            "stsd stts stss ctts stsc stsz stco)))) udta) free mdat)");
-    KVAtomBox* const moov = file->findFirstChild(true, KVAtomType("moov"));
+    KVAtomBox* const moov = file->getChild(1);
     moov->removeChild(2);
     EXPECT_EQ(file->readAllTrackMediaAtomBoxes(), 0);
     EXPECT_EQ(moov->getChildCount(), 2) << "a tree that is there may hold changes";
@@ -308,13 +252,10 @@ TEST(KVAtomBoxFile, TracksAreReadDownToTheirTables)
     } const rows[] = {
         {"no moov", atom("ftyp") + atom("mdat"), -1, "0(ftyp mdat)"},
         {"two", atom("moov", atom("mvhd")) + atom("moov"), -1, "0(moov moov)"},
-        {"empty", atom("moov"), 0, "0(moov)"},
         {"no minf", atom("moov", atom("trak", atom("mdia", atom("mdhd")))), 0,
          "0(moov(trak(mdia(mdhd))))"},
         {"stbl only below minf", atom("moov", atom("trak", atom("stbl", atom("stsd")))), 0,
          "0(moov(trak(stbl)))"},
-        {"track in a track", atom("moov", atom("trak", atom("trak", atom("mdia")))), 0,
-         "0(moov(trak(trak)))"},
     };
     for (Row const& row : rows) {
         Opened other(row.bytes);
@@ -322,6 +263,8 @@ TEST(KVAtomBoxFile, TracksAreReadDownToTheirTables)
         EXPECT_EQ(show(*other), row.tree) << row.name;
     }
     EXPECT_EQ(KVAtomBoxFile().readAllTrackMediaAtomBoxes(), -1);
+    EXPECT_EQ(KVAtomBoxFile().readChildAtomBoxHeaders(moov), -1);
+    EXPECT_EQ(file->readChildAtomBoxHeaders(nullptr), -1);
 }
 
 TEST(KVAtomBoxFile, TracksAreFoundByHandlerAndFlag)
@@ -337,7 +280,6 @@ TEST(KVAtomBoxFile, TracksAreFoundByHandlerAndFlag)
         std::vector<std::string> found;
     } const rows[] = {
         {"vide", 1, {"third", "fourth"}},
-        {"vide", -7, {"third", "fourth"}},
         {"vide", 0, {"first"}},
         {"soun", 1, {"second"}},
         {"soun", 0, {}},
@@ -347,37 +289,32 @@ TEST(KVAtomBoxFile, TracksAreFoundByHandlerAndFlag)
         std::vector<KVAtomBox*> tracks{nullptr};
         auto const type = static_cast<unsigned int>(numberAt(row.handler, 0, 4));
         EXPECT_EQ(file->findTracks(tracks, type, row.enabled), 0);
-        ASSERT_FALSE(tracks.empty());
-        EXPECT_FALSE(tracks[0]) << "the vector is not cleared";
-        std::vector<std::string> found;
-        for (std::size_t i = 1; i < tracks.size(); ++i) {
+        ASSERT_EQ(tracks.size(), row.found.size() + 1) << "the vector is not cleared";
+        for (std::size_t i = 0; i < row.found.size(); ++i) {
             auto const data = emptyData();
-            EXPECT_EQ(file->readTrackSampleDescription(tracks[i], data), 0);
-            found.push_back(bytesOf(data));
+            EXPECT_EQ(file->readTrackSampleDescription(tracks[i + 1], data), 0);
+            EXPECT_EQ(bytesOf(data), row.found[i]);
         }
-        EXPECT_EQ(found, row.found) << row.handler << row.enabled;
     }
-    std::vector<KVAtomBox*> none;
-    EXPECT_EQ(KVAtomBoxFile().findTracks(none, 0, 1), 0) << "no tracks are no failure";
 }
 
 TEST(KVAtomBoxFile, ATrackThatCanNotBeReadEndsTheSearch)
 {
-    std::string const good = trackAtom({"vide", 1, "stsd", {}});
-    std::string const header = atom("tkhd", be32(1));
+    std::string const good = trackAtom({"vide", 1, "stsd", {}}), tkhd = atom("tkhd", be32(1));
+    auto const hdlr = [](std::string const& end) {
+        return atom("mdia", atom("hdlr", be64(0) + end));
+    };
     struct Row {
         char const* name;
         std::string track;
         int code;
     } const rows[] = {
         {"sound", good, 0},
-        {"no tkhd", atom("trak", atom("mdia", atom("hdlr", be64(0) + "vide"))), -1},
-        {"no hdlr", atom("trak", header), -1},
-        {"tkhd of 3 bytes",
-         atom("trak", atom("tkhd", "123") + atom("mdia", atom("hdlr", be64(0) + "vide"))), -1},
-        {"hdlr of 11 bytes", atom("trak", header + atom("mdia", atom("hdlr", be64(0) + "vid"))),
-         -1},
-        {"shortest", atom("trak", header + atom("mdia", atom("hdlr", be64(0) + "vide"))), 0},
+        {"no tkhd", atom("trak", hdlr("vide")), -1},
+        {"no hdlr", atom("trak", tkhd), -1},
+        {"tkhd of 3 bytes", atom("trak", atom("tkhd", "123") + hdlr("vide")), -1},
+        {"hdlr of 11 bytes", atom("trak", tkhd + hdlr("vid")), -1},
+        {"shortest", atom("trak", tkhd + hdlr("vide")), 0},
     };
     for (Row const& row : rows) {
         Opened file(atom("moov", good + row.track + good));
@@ -389,26 +326,10 @@ TEST(KVAtomBoxFile, ATrackThatCanNotBeReadEndsTheSearch)
     Opened file(atom("moov", good));
     ASSERT_EQ(file->readAllTrackMediaAtomBoxes(), 0);
     KVAtomBox* const track = file->findFirstChild(true, KVAtomType("trak"));
-    int enabled = 0;
-    EXPECT_EQ(file->readTrackInfo(track, nullptr, &enabled), 0);
-    EXPECT_EQ(enabled, 1);
     EXPECT_EQ(file->readTrackInfo(nullptr, nullptr, nullptr), -1);
     EXPECT_EQ(file->readTrackSampleDescription(nullptr, emptyData()), -1);
     EXPECT_EQ(file->readTrackSampleDescription(track, nullptr), -1);
     EXPECT_EQ(file->readTrackSampleDescription(track->getChild(0), emptyData()), -1) << "no stsd";
     file->closeInputFile();
     EXPECT_EQ(file->readTrackInfo(track, nullptr, nullptr), -1);
-}
-
-TEST(KVAtomBoxFile, ManyTopLevelAtomsAreRead)
-{
-    constexpr int kCount = 100'000;
-    std::string bytes;
-    for (int i = 0; i < kCount; ++i)
-        bytes += atom("free", i % 3 ? "123" : "");
-    Opened file(bytes);
-    ASSERT_EQ(file->readTopLevelAtomBoxHeaders(), 0);
-    EXPECT_EQ(file->getChildCount(), kCount);
-    KVAtomBox const* const last = file->getChild(kCount - 1);
-    EXPECT_EQ(last->getOffset() + last->getSize(), bytes.size());
 }

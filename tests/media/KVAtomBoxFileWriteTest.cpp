@@ -3,12 +3,13 @@
 #include "media/Movie.h"
 
 #include <fcntl.h>
-#include <functional>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 #include <thread>
 #include <unistd.h>
+
+using namespace std::string_literals;
 
 namespace {
 
@@ -19,7 +20,7 @@ KVURL url(std::string const& path)
 
 /// Opens the bytes, reads the tree down to the tables, and lets `change` at it.
 struct Rewrite {
-    Folder folder;
+    TemporaryFolder folder;
     KVAtomBoxFile file;
 
     explicit Rewrite(std::string_view bytes) : Rewrite() { openAndRead(folder.write("in", bytes)); }
@@ -70,15 +71,12 @@ TEST(KVAtomBoxFileWrite, WhatIsNotTouchedIsCopiedByteForByte)
         Rewrite rewrite;
         rewrite.openAndRead(sampleMovie(name));
         EXPECT_TRUE(rewrite.write() == fileBytes(sampleMovie(name))) << name;
-        EXPECT_EQ(rewrite.file.getWritePercentDone() > 90, true) << name;
+        EXPECT_GT(rewrite.file.getWritePercentDone(), 99) << name;
     }
-    Folder const folder;
-    KVAtomBoxFile unread;
+    Rewrite unread;
     std::string const junk = atom("free") + longAtom("mdat", "123") + "junk";
-    ASSERT_EQ(unread.openInputFile(url(folder.write("in", junk)).cf_url()), 0);
-    ASSERT_EQ(unread.openOutputFile(url(folder.path("out")).cf_url()), 0);
-    EXPECT_EQ(unread.writeAtomBoxFileWithUpdates(), 0);
-    EXPECT_EQ(fileBytes(folder.path("out")), junk) << "a tree that was not read is one piece";
+    ASSERT_EQ(unread.file.openInputFile(url(unread.folder.write("in", junk)).cf_url()), 0);
+    EXPECT_EQ(unread.write(), junk) << "a tree that was not read is one piece";
 }
 
 TEST(KVAtomBoxFileWrite, SamplesStayTheSameWhateverStandsInFrontOfThem)
@@ -96,20 +94,6 @@ TEST(KVAtomBoxFileWrite, SamplesStayTheSameWhateverStandsInFrontOfThem)
             std::string const changed = rewrite.write();
             EXPECT_EQ(changed.size(), original.size() + by);
             EXPECT_TRUE(samplesOf(changed) == samples) << name << by;
-            EXPECT_EQ(rewrite.find("stco").getPayloadData() != nullptr, inFront)
-                << "without a shift tables stay on the disk";
-            EXPECT_EQ(rewrite.file.getWritePercentDone() > 100, by == 5000)
-                << "percent of the input";
-
-            // Once more, smaller than the original.
-            KVAtomBox& moov = rewrite.find("moov");
-            while (moov.findFirstChild(false, KVAtomType("free")))
-                moov.removeChild(moov.getChildCount() - 1);
-            moov.removeChild(moov.getChildCount() - 1); // udta
-            moov.updateSize();
-            moov.updateParentSizes();
-            EXPECT_TRUE(samplesOf(rewrite.write()) == samples) << name << by;
-            EXPECT_LT(fileBytes(rewrite.folder.path("out")).size(), original.size());
         }
     }
 }
@@ -117,38 +101,20 @@ TEST(KVAtomBoxFileWrite, SamplesStayTheSameWhateverStandsInFrontOfThem)
 TEST(KVAtomBoxFileWrite, ASecondWriteStartsFromTheTablesOfTheInput)
 {
     std::string const original = fileBytes(sampleMovie("head-moov.mp4"));
-    Rewrite rewrite;
-    rewrite.openAndRead(sampleMovie("head-moov.mp4"));
+    Rewrite rewrite(original);
     grow(rewrite, 100);
     std::string const first = rewrite.write();
     EXPECT_EQ(rewrite.write(0, "again"), first) << "shifts do not add up";
     KVAtomBox& moov = rewrite.find("moov");
-    moov.removeChild(moov.getChildCount() - 1);
-    moov.updateSize();
-    moov.updateParentSizes();
+    auto const removeLast = [&] {
+        moov.removeChild(moov.getChildCount() - 1);
+        moov.updateSize();
+        moov.updateParentSizes();
+    };
+    removeLast();
     EXPECT_TRUE(rewrite.write(0, "back") == original) << "no shift, so the tables of the input";
-}
-
-TEST(KVAtomBoxFileWrite, CopiesWriteOnTheirOwn)
-{
-    Folder const folder;
-    std::string const path = sampleMovie("head-moov.mp4");
-    auto original = std::make_unique<KVAtomBoxFile>();
-    ASSERT_EQ(original->openInputFile(url(path).cf_url()), 0);
-    ASSERT_EQ(original->readAllTrackMediaAtomBoxes(), 0);
-    EXPECT_EQ(original->getFileType(), KVAtomType("isom"));
-    ASSERT_EQ(original->openOutputFile(url(folder.path("first")).cf_url()), 0);
-    ASSERT_EQ(original->writeAtomBoxFileWithUpdates(), 0);
-
-    KVAtomBoxFile copy(*original);
-    original.reset();
-    EXPECT_EQ(copy.getFileType(), KVAtomType("isom")) << "remembered; no input is open";
-    EXPECT_EQ(copy.getWriteDoneResult(), 0);
-    EXPECT_EQ(copy.getWritePercentDone(), 0.0);
-    EXPECT_EQ(copy.writeAtomBoxFileWithUpdates(), -1);
-    KVAtomBox* const tables = copy.findFirstChild(true, KVAtomType("stbl"));
-    for (KVAtomBox* above = tables; above != &copy; above = above->getParent())
-        ASSERT_TRUE(above) << "parents lead upward in the copy";
+    removeLast(); // udta: now it is smaller than the input
+    EXPECT_TRUE(samplesOf(rewrite.write(0, "less")) == samplesOf(original));
 }
 
 // --- Tables ---
@@ -163,17 +129,17 @@ TEST(KVAtomBoxFileWrite, TablesMoveByWhatStandsInFrontOfTheFirstMediaData)
     } const rows[] = {
         {"narrow", false, "00000002 00000100 00000200", "00000002 00000110 00000210"},
         {"wraps", false, "00000001 FFFFFFF8", "00000001 00000008"}, // never widened: meant
-        {"wide", true, "00000001 00000000FFFFFFF8", "00000001 0000000100000008"},
         {"wraps too", true, "00000001 FFFFFFFFFFFFFFFF", "00000001 000000000000000F"},
-        {"empty", false, "00000000", "00000000"},
         {"bytes behind stay", false, "00000001 00000001 00000001", "00000001 00000011 00000001"},
         {"too many for its length", false, "00000003 00000100 00000200",
          "00000003 00000100 00000200"},
         {"far too many", true, "FFFFFFFF 0000000000000001", "FFFFFFFF 0000000000000001"},
         {"no count", false, "0000", "0000"},
+        {"long header", false, "00000001 00000100", "00000001 00000108"}, // becomes 8 shorter
     };
     for (Row const& row : rows) {
-        std::string const table = atom(row.wide ? "co64" : "stco", be32(0) + fromHex(row.entries));
+        auto const make = row.name == "long header"s ? longAtom : atom;
+        std::string const table = make(row.wide ? "co64" : "stco", be32(0) + fromHex(row.entries));
         std::string const movie =
             atom("moov", atom("trak", atom("mdia", atom("minf", atom("stbl", table)))));
         Rewrite rewrite(movie + atom("mdat", "1234"));
@@ -217,8 +183,12 @@ TEST(KVAtomBoxFileWrite, NewTopLevelAtomsCountAsInFrontWhereverTheyStand)
     }
 }
 
-TEST(KVAtomBoxFileWrite, ATableThatCanNotBeReadStopsTheWriteBeforeItStarts)
+TEST(KVAtomBoxFileWrite, AnInputThatShrankFailsAndATableThatCanNotBeReadStopsTheWriteBeforeItStarts)
 {
+    Rewrite shrunk(fileBytes(sampleMovie("head-moov.mp4")));
+    ASSERT_EQ(truncate(shrunk.folder.path("in").c_str(), 5000), 0);
+    shrunk.write(-1);
+
     Rewrite rewrite(fileBytes(sampleMovie("head-moov.mp4")));
     grow(rewrite, 16);
     rewrite.find("stco").setOffset(1'000'000);
@@ -236,10 +206,8 @@ TEST(KVAtomBoxFileWrite, HeadersTakeTheLongFormAbove7FFFFFFE)
         std::uint64_t size, payloadSize;
         std::string written;
     } const rows[] = {
-        {9, 1, be32(9) + "uuid"},
         {0x7FFFFFFE, 1, be32(0x7FFFFFFE) + "uuid"},
         {0x7FFFFFFF, 1, be32(1) + "uuid" + be64(0x7FFFFFFF)},
-        {0x123456789A, 1, be32(1) + "uuid" + be64(0x123456789A)},
         {5, 5, ""}, // no header when size is not above payload size
         {0, 0, ""},
     };
@@ -257,7 +225,7 @@ TEST(KVAtomBoxFileWrite, ARebuiltAtomBetweenTheTwoLimitsIsEightBytesShortInItsSi
 {
     // updateSize allows for 16 bytes of header above 0xFFFFFFFE only, the writer uses them above
     // 0x7FFFFFFE: meant.
-    Folder const folder;
+    TemporaryFolder const folder;
     std::string const path = folder.write(
         "in",
         atom("moov", atom("free") + be32(0x80000000) + "skip").replace(0, 4, be32(0x80000010)));
@@ -272,9 +240,7 @@ TEST(KVAtomBoxFileWrite, ARebuiltAtomBetweenTheTwoLimitsIsEightBytesShortInItsSi
     EXPECT_EQ(rewrite.file.writeAtomBoxFileWithUpdates(), 0);
     EXPECT_EQ(std::filesystem::file_size(folder.path("out")), 0x80000018u);
     std::string start(32, '\0');
-    int const file = ::open(folder.path("out").c_str(), O_RDONLY);
-    EXPECT_EQ(::read(file, start.data(), start.size()), 32);
-    ::close(file);
+    std::ifstream(folder.path("out"), std::ios::binary).read(start.data(), 32);
     EXPECT_EQ(toHex(start), toHex(be32(1) + "moov" + be64(0x80000010) + atom("free") +
                                   be32(0x80000000) + "skip"));
 }
@@ -307,24 +273,6 @@ TEST(KVAtomBoxFileWrite, WhatReadingDropsIsMeasuredBeforeTheWrite)
     EXPECT_TRUE(trailing.write() == fileBytes(sampleMovie("tail-moov.mp4"))) << "junk is dropped";
 }
 
-TEST(KVAtomBoxFileWrite, ATableWithALongHeaderIsMeasuredAgain)
-{
-    auto const movie = [](std::string const& table) {
-        return atom("moov", atom("trak", atom("mdia", atom("minf", atom("stbl", table)))));
-    };
-    auto const entries = [](std::uint64_t offset) { return be32(0) + be32(1) + be32(offset); };
-    std::uint64_t const start = movie(longAtom("stco", entries(0))).size() + 8;
-    Rewrite rewrite(movie(longAtom("stco", entries(start))) + atom("mdat", "data"));
-    insertAtom(rewrite.file, "free", std::string(92, 'x'), 0);
-    for (int round = 0; round < 2; ++round)
-        EXPECT_EQ(toHex(rewrite.write()),
-                  toHex(atom("free", std::string(92, 'x')) +
-                        movie(atom("stco", entries(start + 100 - 8))) + atom("mdat", "data")))
-            << round;
-    rewrite.file.removeChild(0);
-    EXPECT_EQ(rewrite.write(), movie(longAtom("stco", entries(start))) + atom("mdat", "data"));
-}
-
 // --- Large files ---
 
 TEST(KVAtomBoxFileWrite, AFileOf5GiBKeepsItsHoles)
@@ -337,15 +285,9 @@ TEST(KVAtomBoxFileWrite, AFileOf5GiBKeepsItsHoles)
     Rewrite rewrite;
     std::string const path = rewrite.folder.write("in", movie(kFar, kFar) + be32(1) + "mdat" +
                                                             be64(kFar + 4 - movie(0, 0).size()));
-    {
-        int const file = ::open(path.c_str(), O_WRONLY);
-        ASSERT_EQ(::pwrite(file, "data", 4, kFar), 4);
-        ::close(file);
-    }
+    std::filesystem::resize_file(path, kFar);
+    std::ofstream(path, std::ios::binary | std::ios::app) << "data";
     rewrite.openAndRead(path);
-    ASSERT_EQ(show(rewrite.file),
-              "0(ftyp moov(mvhd trak(tkhd mdia(hdlr minf(hdlr stbl(stsd stsc stsz "
-              "co64)))) trak(tkhd mdia(hdlr minf(hdlr stbl(stsd stsc stsz stco))))) mdat)");
     grow(rewrite, 32);
     std::string const out = rewrite.folder.path("out");
     ASSERT_EQ(rewrite.file.openOutputFile(url(out).cf_url()), 0);
@@ -355,11 +297,10 @@ TEST(KVAtomBoxFileWrite, AFileOf5GiBKeepsItsHoles)
     struct stat info = {};
     ASSERT_EQ(stat(out.c_str(), &info), 0);
     EXPECT_LT(info.st_blocks * 512, 16 << 20) << "the hole stays one";
-    int const file = ::open(out.c_str(), O_RDONLY);
     std::string start(movie(0, 0).size() + 32 + 16, '\0'), sample(4, '\0');
-    EXPECT_EQ(::pread(file, start.data(), start.size(), 0), static_cast<ssize_t>(start.size()));
-    EXPECT_EQ(::pread(file, sample.data(), 4, kFar + 32), 4);
-    ::close(file);
+    std::ifstream file(out, std::ios::binary);
+    file.read(start.data(), static_cast<std::streamsize>(start.size()));
+    file.seekg(kFar + 32).read(sample.data(), 4);
     EXPECT_EQ(sample, "data");
     EXPECT_EQ(toHex(findPayload(start, "moov/trak/mdia/minf/stbl/co64")),
               toHex(be32(0) + be32(1) + be64(kFar + 32)));
@@ -369,7 +310,7 @@ TEST(KVAtomBoxFileWrite, AFileOf5GiBKeepsItsHoles)
 
 TEST(KVAtomBoxFileWrite, HolesAtTheEndOfTheFileAreKept)
 {
-    Folder const folder;
+    TemporaryFolder const folder;
     std::string const path = folder.write("in", be32(4 << 20) + "mdat" + "start");
     ASSERT_EQ(truncate(path.c_str(), 4 << 20), 0);
     Rewrite rewrite;
@@ -383,7 +324,7 @@ TEST(KVAtomBoxFileWrite, HolesAtTheEndOfTheFileAreKept)
 TEST(KVAtomBoxFileWrite, OutputsThatCanNotBeOpenedGiveTheStatedCodes)
 {
     Rewrite rewrite(atom("free", "1234"));
-    Folder const& folder = rewrite.folder;
+    TemporaryFolder const& folder = rewrite.folder;
     std::filesystem::permissions(folder.path("."), std::filesystem::perms::owner_all);
     std::filesystem::create_hard_link(folder.path("in"), folder.path("hard"));
     std::filesystem::create_symlink(folder.path("in"), folder.path("soft"));
@@ -422,13 +363,6 @@ TEST(KVAtomBoxFileWrite, AFullDiskIsNoSuccess)
     }
 }
 
-TEST(KVAtomBoxFileWrite, AnInputThatShrankGivesAFailure)
-{
-    Rewrite rewrite(fileBytes(sampleMovie("head-moov.mp4")));
-    ASSERT_EQ(truncate(rewrite.folder.path("in").c_str(), 5000), 0);
-    rewrite.write(-1);
-}
-
 // --- Cancelling ---
 
 TEST(KVAtomBoxFileWrite, CancellingEndsTheWriteAtEveryStage)
@@ -436,7 +370,7 @@ TEST(KVAtomBoxFileWrite, CancellingEndsTheWriteAtEveryStage)
     std::string const media(2 << 20, 'm');
     // After so many bytes have come out: in the header and payload in memory, in the copied media
     // data.
-    for (std::size_t const after : {1u, 5000u, 400'000u, 1'500'000u}) {
+    for (std::size_t const after : {1u, 5000u, 400'000u}) {
         Rewrite rewrite(atom("free") + atom("mdat", media));
         insertAtom(rewrite.file, "uuid", std::string(300'000, 'u'), 1);
         std::string const pipe = rewrite.folder.path("pipe");
@@ -463,25 +397,4 @@ TEST(KVAtomBoxFileWrite, CancellingEndsTheWriteAtEveryStage)
         rewrite.file.cancelWrite();
         EXPECT_EQ(rewrite.write().size(), media.size() + 300'024) << "the next write starts afresh";
     }
-}
-
-TEST(KVAtomBoxFileWrite, ProgressIsSeenFromAnotherThread)
-{
-    Rewrite rewrite(atom("mdat", std::string(3 << 20, 'm')));
-    ASSERT_EQ(rewrite.file.openOutputFile(url(rewrite.folder.path("out")).cf_url()), 0);
-    std::atomic<bool> sound{true};
-    std::thread watcher([&] {
-        double last = 0;
-        while (rewrite.file.getWriteDoneResult() == 0) {
-            double const now = rewrite.file.getWritePercentDone();
-            if (now < last || now > 100)
-                sound = false;
-            last = now;
-            std::this_thread::yield();
-        }
-    });
-    EXPECT_EQ(rewrite.file.writeAtomBoxFileWithUpdates(), 0);
-    watcher.join();
-    EXPECT_TRUE(sound);
-    EXPECT_EQ(rewrite.file.getWritePercentDone(), 100.0);
 }

@@ -53,7 +53,6 @@ TEST(KVImageDescAtomBox, PayloadsAreReadIntoATree)
         char const* tree;
         std::uint64_t size; // of the first description
     } const rows[] = {
-        {"no extension", videoDescription(), "0(avc1(stsd))", 86},
         {"extensions", videoDescription(kPasp + atom("colr", "nclc"), "hvc1"),
          "0(hvc1(stsd pasp colr))", 86 + 16 + 12},
         {"spherical", videoDescription(spherical), "0(avc1(stsd sv3d(svhd proj(prhd equi))))",
@@ -64,8 +63,6 @@ TEST(KVImageDescAtomBox, PayloadsAreReadIntoATree)
          "0(avc1(stsd sinf))", 86 + 24},
         {"colour table", withColourTable(1, be64(1), kPasp), "0(avc1(stsd clut pasp))",
          86 + 24 + 16},
-        {"colour table of one entry", withColourTable(0, "", kPasp), "0(avc1(stsd clut pasp))",
-         86 + 16 + 16},
         {"four zeros at the end fall away", videoDescription(kPasp + be32(0)), "0(avc1(stsd pasp))",
          86 + 16},
         {"so does junk", videoDescription(kPasp + be32(99) + "junk"), "0(avc1(stsd pasp))",
@@ -81,9 +78,6 @@ TEST(KVImageDescAtomBox, PayloadsAreReadIntoATree)
         {"colour table beyond the end", withColourTable(3, be64(1), ""), "0(avc1(stsd))", 86 + 24},
         {"description beyond the end", videoDescription().replace(8, 4, be32(87)), "0", 0},
         {"count beyond the end", videoDescription().replace(4, 4, be32(2)), "0", 0},
-        {"largest count", videoDescription().replace(4, 4, be32(0xFFFFFFFF)), "0", 0},
-        {"count 0", videoDescription().replace(4, 4, be32(0)), "0", 0},
-        {"no count", be32(0), "0", 0},
         {"nothing", "", "0", 0},
     };
     for (Row const& row : rows) {
@@ -106,8 +100,8 @@ TEST(KVImageDescAtomBox, DescriptionsFollowEachOtherByTheirWrittenSize)
     EXPECT_EQ(descriptions.getImageDescCodec(1), KVAtomType("mp4v"));
     EXPECT_EQ(descriptions.getImageDescCodec(-1), 0u);
     EXPECT_EQ(descriptions.getImageDescCodec(3), 0u);
-    std::string const cut = payload.substr(0, payload.size() - 1) + "x";
-    EXPECT_EQ(parse(cut.substr(0, cut.size() - 1)).getImageDescCount(), 2) << "the sound ones stay";
+    EXPECT_EQ(parse(payload.substr(0, payload.size() - 1)).getImageDescCount(), 2)
+        << "the sound ones stay";
 }
 
 TEST(KVImageDescAtomBox, SampleMoviesComeOutAsTheyWere)
@@ -129,40 +123,22 @@ TEST(KVImageDescAtomBox, SampleMoviesComeOutAsTheyWere)
     EXPECT_FALSE(none.copyFullImageDescToData(false));
 }
 
-TEST(KVImageDescAtomBox, WhatReadingDropsIsMeasuredBeforeWriting)
-{
-    std::string const sound = atom("sv3d", atom("svhd", "x"));
-    KVImageDescAtomBox descriptions = parse(
-        videoDescription(atom("sv3d", atom("svhd", "x") + "junk") + longAtom("free") + kPasp));
-    EXPECT_EQ(toHex(full(descriptions)), toHex(videoDescription(sound + atom("free") + kPasp)));
-}
-
 TEST(KVImageDescAtomBox, PayloadsAreCopiedFromWhereverTheyLie)
 {
     KVImageDescAtomBox descriptions = parse(
         videoDescription(atom("sv3d", atom("proj", atom("prhd", "abc"))) + atom("free") + kPasp));
-    struct Row {
-        int index;
-        char const* type;
-        char const* bytes; // hexadecimal; null where there is none
-    } const rows[] = {
-        {0, "pasp", "0000000400000003"},
-        {0, "prhd", "616263"},
-        {0, "proj", "0000000B70726864616263"}, // a container: its children
-        {0, "free", ""},
-        {0, "colr", nullptr},
-        {1, "pasp", nullptr},
-        {-1, "pasp", nullptr},
+    auto const payload = [&](char const(&type)[5]) {
+        auto const data = descriptions.copyImageDescData(0, KVAtomType(type));
+        return data ? bytesOf(data) : "none";
     };
-    for (Row const& row : rows) {
-        auto const data = descriptions.copyImageDescData(
-            row.index, static_cast<unsigned int>(numberAt(row.type, 0, 4)));
-        EXPECT_EQ(data.get() != nullptr, row.bytes != nullptr) << row.type;
-        EXPECT_EQ(toHex(bytesOf(data)), row.bytes ? row.bytes : "") << row.type;
-    }
-    EXPECT_EQ(bytesOf(descriptions.copyImageDescData(0, KVAtomType("stsd"))).size(), 78u);
+    EXPECT_EQ(payload("pasp"), be32(4) + be32(3));
+    EXPECT_EQ(payload("prhd"), "abc");
+    EXPECT_EQ(payload("proj"), atom("prhd", "abc")) << "a container: its children";
+    EXPECT_EQ(payload("free"), "");
+    EXPECT_EQ(payload("colr"), "none");
+    EXPECT_FALSE(descriptions.copyImageDescData(1, KVAtomType("pasp")));
     descriptions.setImageDescData(0, KVAtomType("prhd"), makeData("set"));
-    EXPECT_EQ(bytesOf(descriptions.copyImageDescData(0, KVAtomType("prhd"))), "set");
+    EXPECT_EQ(payload("prhd"), "set");
 }
 
 TEST(KVImageDescAtomBox, PlacesInTheSourceAreCutTo16Bits)
@@ -173,9 +149,6 @@ TEST(KVImageDescAtomBox, PlacesInTheSourceAreCutTo16Bits)
     EXPECT_EQ(bytesOf(descriptions.copyImageDescData(0, KVAtomType("avcC"))), large);
     EXPECT_EQ(toHex(bytesOf(descriptions.copyImageDescData(0, KVAtomType("pasp")))),
               toHex(videoDescription().substr(0, 8)));
-    KVImageDescAtomBox const longer =
-        parse(videoDescription(atom("avcC", std::string(0x10003, 'L'))));
-    EXPECT_EQ(bytesOf(longer.copyImageDescData(0, KVAtomType("avcC"))), "LLL");
     KVImageDescAtomBox const container = parse(videoDescription(
         atom("sv3d", atom("svhd", std::string(0x10003 - 16, 's')) + atom("proj"))));
     EXPECT_EQ(bytesOf(container.copyImageDescData(0, KVAtomType("sv3d"))), std::string(3, '\0'))
@@ -211,11 +184,8 @@ TEST(KVImageDescAtomBox, ColourIsWrittenInAnotherLayoutThanItIsRead)
         int code;
     } const rows[] = {
         {"6E636C63 0009 0010 0009", 0},
-        {"6E636C63 0009 0010 0009 FF", 0},
         {"6E636C63 0009 0010 00", -1},
         {"6E636C78 0009 0010 0009 00", -1}, // nclx
-        {"70726F66 0009 0010 0009", -1},
-        {"", -1},
         {nullptr, -1},
     };
     for (Row const& row : rows) {
@@ -224,14 +194,12 @@ TEST(KVImageDescAtomBox, ColourIsWrittenInAnotherLayoutThanItIsRead)
         int primaries = 0, transfer = 0, matrix = 0;
         EXPECT_EQ(descriptions.getImageDescColorInfo(0, &primaries, &transfer, &matrix), row.code);
         EXPECT_EQ(descriptions.getImageDescColorInfo(0, nullptr, nullptr, nullptr), row.code);
-        EXPECT_EQ(primaries, row.code == 0 ? 9 : 0);
-        EXPECT_EQ(transfer, row.code == 0 ? 16 : 0);
-        EXPECT_EQ(matrix, row.code == 0 ? 9 : 0);
+        EXPECT_EQ(std::tuple(primaries, transfer, matrix),
+                  row.code == 0 ? std::tuple(9, 16, 9) : std::tuple(0, 0, 0));
     }
     KVImageDescAtomBox descriptions = parse(videoDescription());
     descriptions.setImageDescColorInfo(0, 0x10102, 0x304, 0x506);
     descriptions.setImageDescColorInfo(1, 1, 1, 1);
-    descriptions.setImageDescColorInfo(-1, 1, 1, 1);
     EXPECT_EQ(toHex(full(descriptions)),
               toHex(videoDescription(atom("colr", fromHex("0102 0000 0000 0304 0506")))));
     EXPECT_EQ(descriptions.getImageDescColorInfo(0, nullptr, nullptr, nullptr), -1)
@@ -240,7 +208,8 @@ TEST(KVImageDescAtomBox, ColourIsWrittenInAnotherLayoutThanItIsRead)
 
 TEST(KVImageDescAtomBox, FieldsAndPixelAspect)
 {
-    KVImageDescAtomBox descriptions = parse(videoDescription());
+    KVImageDescAtomBox original = parse(videoDescription());
+    KVImageDescAtomBox descriptions(original);
     int a = 0, b = 0;
     EXPECT_EQ(descriptions.getImageDescFieldInfo(0, &a, &b), -1);
     EXPECT_EQ(descriptions.getImageDescPixelAspectInfo(0, &a, &b), -1);
@@ -249,14 +218,12 @@ TEST(KVImageDescAtomBox, FieldsAndPixelAspect)
     EXPECT_EQ(toHex(full(descriptions)),
               toHex(videoDescription(atom("fiel", fromHex("020E")) +
                                      atom("pasp", be32(40) + be32(-33)))));
-    EXPECT_EQ(descriptions.getImageDescFieldInfo(0, &a, &b), 0);
-    EXPECT_EQ(a, 2);
-    EXPECT_EQ(b, 14);
-    EXPECT_EQ(descriptions.getImageDescPixelAspectInfo(0, &a, &b), 0);
-    EXPECT_EQ(a, 40);
-    EXPECT_EQ(b, -33);
-    EXPECT_EQ(descriptions.getImageDescPixelAspectInfo(0, nullptr, nullptr), 0);
-    EXPECT_EQ(descriptions.getImageDescPixelAspectInfo(7, &a, &b), -1);
+    EXPECT_EQ(full(original), videoDescription()) << "copies are deep";
+    original = descriptions;
+    EXPECT_EQ(original.getImageDescFieldInfo(0, &a, &b), 0);
+    EXPECT_EQ(std::pair(a, b), std::pair(2, 14));
+    EXPECT_EQ(original.getImageDescPixelAspectInfo(0, &a, &b), 0);
+    EXPECT_EQ(std::pair(a, b), std::pair(40, -33));
     descriptions.setImageDescData(0, KVAtomType("fiel"), makeData("1"));
     descriptions.setImageDescData(0, KVAtomType("pasp"), makeData("1234567"));
     EXPECT_EQ(descriptions.getImageDescFieldInfo(0, &a, &b), -1);
@@ -305,13 +272,6 @@ TEST(KVImageDescAtomBox, HDRAndSphericalPayloadsGoInAndOutAsDictionaries)
                   atom("sv3d", atom("svhd", "svhd") +
                                    atom("proj", atom("equi", "other") + atom("mshp", "mshp") +
                                                     atom("prhd", "pose"))))));
-    // An empty `proj` comes along with what belongs above it.
-    KVImageDescAtomBox onlySource = parse(videoDescription());
-    auto const svhd = makeDictionary({});
-    svhd->setValue("svhd", makeData("s"));
-    onlySource.setImageDescGoogleV2Info(0, svhd);
-    EXPECT_EQ(toHex(full(onlySource)),
-              toHex(videoDescription(atom("sv3d", atom("svhd", "s") + atom("proj")))));
 }
 
 TEST(KVImageDescAtomBox, QuickTimeDescriptionsEndInFourZeros)
@@ -339,19 +299,4 @@ TEST(KVImageDescAtomBox, QuickTimeDescriptionsEndInFourZeros)
         descriptions.setQuickTimeCompatibility(true);
     EXPECT_EQ(tree(descriptions), "0(avc1(stsd pasp 0))") << "not twice";
     EXPECT_EQ(descriptions.getTopAtomBox().getSize(), 86u + 16u + 4u);
-    descriptions.setQuickTimeCompatibility(false);
-    EXPECT_EQ(descriptions.getTopAtomBox().getSize(), 86u + 16u);
-}
-
-TEST(KVImageDescAtomBox, CopiesAreDeep)
-{
-    KVImageDescAtomBox original = parse(videoDescription(kPasp));
-    KVImageDescAtomBox copy(original), assigned;
-    assigned = original;
-    original.setImageDescPixelAspectInfo(0, 1, 1);
-    original = KVImageDescAtomBox();
-    for (KVImageDescAtomBox* one : {&copy, &assigned}) {
-        one->setImageDescData(0, KVAtomType("fiel"), makeData("22"));
-        EXPECT_EQ(toHex(full(*one)), toHex(videoDescription(kPasp + atom("fiel", "22"))));
-    }
 }

@@ -37,14 +37,11 @@ TEST(KVXMPStringParser, ElementsBecomeNestedDictionaries)
         char const* result;
     } const rows[] = {
         {"text outside every level", "<a>1</a>", R"({a:"1"})"},
-        {"empty", "<a/>", R"({a:""})"},
         {"the text of an outer element goes with the inner one's end", "<a>x<b>1</b>y</a>",
          R"({b:"1"})"},
-        {"white space is text", "<a> 1\n</a>", "{a:\" 1\n\"}"},
         {"entities, references and CDATA", "<a>&lt;&#x41;&amp;<![CDATA[<&]]></a>",
          R"({a:"<A&<&"})"},
         {"attributes", "<a b='1' xmlns:c='u'/>", R"({a:{b:"1" xmlns:c:"u" a:""}})"},
-        {"attributes and text", "<a b='1'>2</a>", R"({a:{b:"1" a:"2"}})"},
         {"names keep their prefix, declared or not", "<n:a n:b='1'/>", R"({n:a:{n:b:"1" n:a:""}})"},
         {"repeated", "<r><a>1</a><a>2</a></r>", R"({a:{a-0:"1" a-1:"2"}})"},
         {"a third one adds its name", "<r><a>1</a><a>2</a><a>3</a></r>",
@@ -58,11 +55,8 @@ TEST(KVXMPStringParser, ElementsBecomeNestedDictionaries)
          R"({x:xmpmeta:{rdf:RDF:{rdf:Description:{a:"1"}}}})"},
         {"attributes of a level lie in it", "<x:xmpmeta><rdf:Description a='1'/></x:xmpmeta>",
          R"({x:xmpmeta:{rdf:Description:{rdf:Description:{a:"1"}}}})"},
-        {"an empty level leaves nothing", "<x:xmpmeta><rdf:RDF/></x:xmpmeta>", "{}"},
         {"spherical", "<rdf:SphericalVideo xmlns:a='u'><a:b>1</a:b></rdf:SphericalVideo>",
          R"({rdf:SphericalVideo:{rdf:SphericalVideo:{xmlns:a:"u"} a:b:"1"}})"},
-        {"text behind an inner level", "<r><rdf:RDF><a>1</a></rdf:RDF></r>",
-         R"({rdf:RDF:{a:"1"}})"},
         {"of two descriptions the second stays", // meant
          "<rdf:RDF><rdf:Description><a>1</a></rdf:Description>"
          "<rdf:Description><b>2</b></rdf:Description></rdf:RDF>",
@@ -81,8 +75,6 @@ TEST(KVXMPStringParser, ElementsBecomeNestedDictionaries)
         {"a packet",
          "<?xpacket begin='\xEF\xBB\xBF' id='W5M0'?><x:xmpmeta a='1'/>\n<?xpacket end='w'?>\n  ",
          R"({x:xmpmeta:{x:xmpmeta:{a:"1"}}})"},
-        {"comments are passed over", "<!-- a --><a>1<!-- b -->2</a>", R"({a:"12"})"},
-        {"a mark of the byte order", "\xEF\xBB\xBF<a>1</a>", R"({a:"1"})"},
         {"another encoding is not believed",
          "<?xml version='1.0' encoding='UTF-16'?><a>\xC3\xA9</a>", "{a:\"\xC3\xA9\"}"},
     };
@@ -99,7 +91,6 @@ TEST(KVXMPStringParser, ErrorsAreKeptAsText)
     } const rows[] = {
         {"empty", "", "XML Parse Error 4, Description: .+, Line: 1"},
         {"not closed", "<a>\n<b>1</b>\n", "XML Parse Error [0-9]+, Description: .+, Line: 3"},
-        {"crossed", "<a><b></a></b>", "XML Parse Error 76, Description: .+, Line: 1"},
         {"unknown entity", "<a>&b;</a>", "XML Parse Error 26, Description: .+, Line: 1"},
         {"no UTF-8", "<a>\xFF</a>", "XML Parse Error 9, Description: .+, Line: 1"},
         {"entities that grow",
@@ -122,24 +113,15 @@ TEST(KVXMPStringParser, ErrorsAreKeptAsText)
     EXPECT_EQ(show(parser.parsedData()), "{}");
 }
 
-TEST(KVXMPStringParser, ALimitInNoElementIsNoLimit)
-{
-    std::string const text = "<a b='" + repeat("= ", 2000) + "'>" + repeat("c=d ", 2000) + "</a>";
-    KVXMPStringParser parser;
-    EXPECT_TRUE(parser.parseXMPString(KVString(text)));
-}
-
 TEST(KVXMPStringParser, EachParseStartsAfresh)
 {
     auto const parser = KVMakeRef<KVXMPStringParser>();
     EXPECT_FALSE(parser->parseXMPString("<x:xmpmeta><a>1</a><b>"));
     EXPECT_FALSE(parser->parseErrorString().isNull());
-    KVCFRef<CFDictionaryRef> const first = parser->parsedData();
     EXPECT_TRUE(parser->parseXMPString("<c>2</c>"));
     EXPECT_TRUE(parser->parseErrorString().isNull())
         << "the end of a document takes the error away";
     EXPECT_EQ(show(parser->parsedData()), R"({c:"2"})");
-    EXPECT_NE(first.get(), parser->parsedData());
 }
 
 TEST(KVXMPStringParser, ManyNamesTakeNoQuadraticTime)

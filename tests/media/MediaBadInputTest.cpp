@@ -59,7 +59,7 @@ private:
     }
 
     // Thousands of files go faster through memory than through a disk.
-    Folder folder_{std::filesystem::exists("/dev/shm") ? "/dev/shm" : testing::TempDir()};
+    TemporaryFolder folder_{std::filesystem::exists("/dev/shm") ? "/dev/shm" : testing::TempDir()};
     std::string input_;
     int written_ = 0;
 };

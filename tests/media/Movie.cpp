@@ -2,8 +2,7 @@
 
 #include <cstdlib>
 #include <fstream>
-#include <gtest/gtest.h>
-#include <sstream>
+#include <iterator>
 #include <stdexcept>
 #include <unistd.h>
 
@@ -52,10 +51,9 @@ std::string fromHex(std::string_view digits)
 std::string toHex(std::string_view bytes)
 {
     std::string digits;
-    for (char const byte : bytes) {
-        digits.push_back("0123456789ABCDEF"[static_cast<unsigned char>(byte) >> 4]);
-        digits.push_back("0123456789ABCDEF"[static_cast<unsigned char>(byte) & 15]);
-    }
+    for (char const byte : bytes)
+        for (int const shift : {4, 0})
+            digits.push_back("0123456789ABCDEF"[byte >> shift & 15]);
     return digits;
 }
 
@@ -169,9 +167,8 @@ std::vector<std::string> samplesOf(std::string const& movie)
 
 std::string fileBytes(std::string const& path)
 {
-    std::ostringstream bytes;
-    bytes << std::ifstream(path, std::ios::binary).rdbuf();
-    return bytes.str();
+    std::ifstream file(path, std::ios::binary);
+    return {std::istreambuf_iterator<char>(file), {}};
 }
 
 std::string sampleMovie(std::string const& name)
@@ -185,28 +182,6 @@ std::vector<std::string> const& plainSamples()
                                                    "head-moov.mp4",      "quicktime.mov",
                                                    "quicktime-colr.mov", "tail-moov.mp4"};
     return names;
-}
-
-Folder::Folder() : Folder(testing::TempDir()) {}
-
-Folder::Folder(std::string const& above)
-{
-    std::string path = above + "/korvane-media-XXXXXX";
-    if (!mkdtemp(path.data()))
-        throw std::runtime_error("no folder for the test");
-    path_ = path;
-}
-
-Folder::~Folder()
-{
-    std::error_code ignored;
-    std::filesystem::remove_all(path_, ignored);
-}
-
-std::string Folder::write(std::string const& name, std::string_view bytes) const
-{
-    std::ofstream(path(name), std::ios::binary) << bytes;
-    return path(name);
 }
 
 Unprivileged::Unprivileged()
@@ -234,7 +209,7 @@ std::string bytesOf(CFDataRef data)
 }
 
 KVCFRef<CFMutableDictionaryRef>
-makeDictionary(std::initializer_list<std::pair<char const*, std::string>> entries)
+makeDictionary(std::vector<std::pair<char const*, std::string>> const& entries)
 {
     auto dictionary = KVCFRef<CFMutableDictionaryRef>::adopt(new __CFDictionary());
     for (auto const& [key, text] : entries)

@@ -1,5 +1,7 @@
 #pragma once
 
+#include <support/TemporaryFolder.h>
+
 #include <korvane/foundation/KVURL.h>
 #include <korvane/media/KVAtomBox.h>
 #include <korvane/media/KVImageDescAtomBox.h>
@@ -7,7 +9,6 @@
 #include <korvane/platform/CFDictionary.h>
 
 #include <cstdint>
-#include <filesystem>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -72,24 +73,6 @@ std::string sampleMovie(std::string const& name);
 /// The names of the sample movies that are not fragmented.
 std::vector<std::string> const& plainSamples();
 
-/// A folder that goes with the test.
-class Folder {
-public:
-    Folder();
-    /// Below another folder than that for temporary files.
-    explicit Folder(std::string const& above);
-    ~Folder();
-    Folder(Folder const&) = delete;
-    Folder& operator=(Folder const&) = delete;
-
-    std::string path(std::string const& name) const { return (path_ / name).string(); }
-    /// Writes a file and answers its path.
-    std::string write(std::string const& name, std::string_view bytes) const;
-
-private:
-    std::filesystem::path path_;
-};
-
 /// Runs as another user for its life where the tests run as root, which may read everything.
 class Unprivileged {
 public:
@@ -104,7 +87,7 @@ KVCFRef<CFDataRef> makeData(std::string_view bytes);
 std::string bytesOf(CFDataRef data);
 /// Keys and strings.
 KVCFRef<CFMutableDictionaryRef>
-makeDictionary(std::initializer_list<std::pair<char const*, std::string>> entries);
+makeDictionary(std::vector<std::pair<char const*, std::string>> const& entries);
 /// A dictionary on one line, in its order: {a:"1" b:{c:"2"}}; data in hexadecimal, null as "null".
 std::string show(NSObject const* value);
 /// The tree of an atom on one line: moov(mvhd trak(tkhd)). A type of 0 is "0".

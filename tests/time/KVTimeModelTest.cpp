@@ -17,18 +17,9 @@ struct Model {
     Exact numerator, denominator;
 };
 
-Exact gcd(Exact a, Exact b)
-{
-    while (!b.isZero()) {
-        a = a % b;
-        std::swap(a, b);
-    }
-    return a;
-}
-
 bool fits(Exact const& x)
 {
-    return x >= Exact(lowest) && x <= Exact(highest);
+    return x >= lowest && x <= highest;
 }
 
 /// One bit at a time.
@@ -38,29 +29,29 @@ CMTime makeTime(Model x, bool alreadyRounded, bool forceReduce)
     result.flags = alreadyRounded ? rounded : valid;
     Exact const limit = 0x7FFFFFFF;
     auto& [num, den] = x;
-    if (!forceReduce && fits(num) && !den.isNegative() && den <= limit) {
-        result.value = num.value();
-        result.timescale = static_cast<std::int32_t>(den.value());
+    if (!forceReduce && fits(num) && den >= 0 && den <= limit) {
+        result.value = static_cast<std::int64_t>(num);
+        result.timescale = static_cast<std::int32_t>(den);
         return result;
     }
-    if (den.isZero())
+    if (den == 0)
         return kCMTimeInvalid;
-    bool const negative = num.isNegative() != den.isNegative();
-    num = num.abs();
-    den = den.abs();
+    bool const negative = (num < 0) != (den < 0);
+    num = abs(num);
+    den = abs(den);
     Exact const common = gcd(num, den);
     num = num / common;
     den = den / common;
-    while (!fits(num) && den > Exact(1)) {
-        num = num.half();
-        den = den.half();
+    while (!fits(num) && den > 1) {
+        num /= 2;
+        den /= 2;
         result.flags = rounded;
     }
     bool spared = false;
     while (den > limit) {
         result.flags = rounded;
-        den = den.half();
-        if (num == Exact(1)) {
+        den /= 2;
+        if (num == 1) {
             if (spared) {
                 num = 0;
                 den = 1;
@@ -68,13 +59,13 @@ CMTime makeTime(Model x, bool alreadyRounded, bool forceReduce)
             }
             spared = true;
         } else {
-            num = num.half();
+            num /= 2;
         }
     }
     if (!fits(num))
         return negative ? kCMTimeNegativeInfinity : kCMTimePositiveInfinity;
-    result.value = negative ? -num.value() : num.value();
-    result.timescale = static_cast<std::int32_t>(den.value());
+    result.value = static_cast<std::int64_t>(negative ? -num : num);
+    result.timescale = static_cast<std::int32_t>(den);
     return result;
 }
 
@@ -85,9 +76,9 @@ CMTime multiplyDivide(CMTime const& t, std::int64_t m, std::int64_t d)
     CMTime const r =
         makeTime({Exact(t.value) * m, Exact(t.timescale) * d}, CMTimeIsRounded(t), false);
     if (CMTimeIsNumeric(r) && !CMTimeIsRounded(r) && r.timescale > t.timescale && t.timescale > 0) {
-        auto const [ticks, rest] = Exact::divide(Exact(r.value) * t.timescale, r.timescale);
-        if (rest.isZero() && fits(ticks))
-            return CMTimeMake(ticks.value(), t.timescale);
+        Exact const ticks = Exact(r.value) * t.timescale;
+        if (ticks % r.timescale == 0 && fits(ticks / r.timescale))
+            return CMTimeMake(static_cast<std::int64_t>(ticks / r.timescale), t.timescale);
     }
     return r;
 }
@@ -102,8 +93,8 @@ CMTime remapExactly(CMTime const& t, CMTime const& o, CMTime const& n)
 
 Exact floorOf(Exact const& a, Exact const& b)
 {
-    auto const [quotient, rest] = Exact::divide(a, b);
-    return rest.isZero() || rest.isNegative() == b.isNegative() ? quotient : quotient - 1;
+    Exact const rest = a % b;
+    return rest == 0 || (rest < 0) == (b < 0) ? Exact(a / b) : Exact(a / b - 1);
 }
 
 /// The grid point that many `frame`s from 0, as the functions answer it.
@@ -111,8 +102,8 @@ CMTime gridPoint(Exact const& count, CMTime const& frame)
 {
     Exact const ticks = count * frame.value;
     if (!fits(ticks))
-        return ticks.isNegative() ? kCMTimeNegativeInfinity : kCMTimePositiveInfinity;
-    return CMTimeMake(ticks.value(), frame.timescale);
+        return ticks < 0 ? kCMTimeNegativeInfinity : kCMTimePositiveInfinity;
+    return CMTimeMake(static_cast<std::int64_t>(ticks), frame.timescale);
 }
 
 /// Whether a - b is exactly c, all numeric.
@@ -182,7 +173,7 @@ void checkAll(CMTime const& t, CMTime const& o, CMTime const& n, std::int64_t m,
         EXPECT_EQ(KV_CMTimeFloorToSampleDuration(t, o), floor);
         EXPECT_EQ(KV_CMTimeCeilingToSampleDuration(t, o), ceiling);
         // Twice the time, and twice the middle, in units of frames / b.
-        bool const lower = (a + a) * (b.isNegative() ? -1 : 1) < (below + above) * b.abs();
+        bool const lower = 2 * a * (b < 0 ? -1 : 1) < (below + above) * abs(b);
         CMTime const nearest = lower ? floor : ceiling;
         if (CMTimeIsNumeric(floor) && CMTimeIsNumeric(ceiling)) {
             EXPECT_EQ(KV_CMTimeRoundToSampleDuration(t, o), nearest);

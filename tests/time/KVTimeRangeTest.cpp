@@ -26,7 +26,6 @@ TEST(KVTimeRange, MakesSafely)
         {T(1, 1), invalid, {T(1, 1), invalid}},
         {T(1, 1), forever, {T(1, 1), forever}},
         // Only where the end would be rounded are the fields reduced.
-        {T(2, 4), T(2, 600), {T(2, 4), T(2, 600)}},
         {T(500000000, 1000000000), T(1001, 30000), {T(1, 2), T(1001, 30000)}},
         {T(500000000, 1000000000), T(2002, 60000), {T(1, 2), T(1001, 30000)}},
         {T(500000000, 1000000000, rounded),
@@ -40,7 +39,6 @@ TEST(KVTimeRange, MakesSafely)
         EXPECT_EQ(CMTimeRangeSaferMake(row.start, row.duration), row.range);
     }
     EXPECT_EQ(CMTimeDO_NOT_USE_THIS_ItsToNotGetSpewRangeSaferMake(T(1, 1), T(2, 1)), R(1, 3));
-    EXPECT_EQ(VexTimeDO_NOT_USE_THIS_ItsToNotGetSpewRangeMake(T(1, 1), T(2, 1)), R(1, 3));
 }
 
 TEST(KVTimeRange, MakesFromItsEnds)
@@ -66,20 +64,11 @@ TEST(KVTimeRange, MakesFromItsEnds)
 
 TEST(KVTimeRange, Ends)
 {
-    struct Row {
-        CMTimeRange range;
-        CMTime end;
-    } const rows[] = {
-        {R(1, 3), T(3, 1)},
-        {{before, forever}, forever}, // over all time
-        {{before, T(1, 1)}, before},
-        {{T(1, 1), forever}, forever},
-        {{forever, before}, invalid},
-        {{invalid, T(1, 1)}, invalid},
-        {{T(500000000, 1000000000), T(1001, 30000)}, T(16001, 30000)},
-    };
-    for (Row const& row : rows)
-        EXPECT_EQ(KV_CMTimeRangeEnd(row.range), row.end);
+    EXPECT_EQ(KV_CMTimeRangeEnd(R(1, 3)), T(3, 1));
+    EXPECT_EQ(KV_CMTimeRangeEnd({before, forever}), forever) << "over all time";
+    EXPECT_EQ(KV_CMTimeRangeEnd({before, T(1, 1)}), before);
+    EXPECT_EQ(KV_CMTimeRangeEnd({forever, before}), invalid);
+    EXPECT_EQ(KV_CMTimeRangeEnd({T(500000000, 1000000000), T(1001, 30000)}), T(16001, 30000));
 }
 
 TEST(KVTimeRange, MovesAndJoins)
@@ -92,9 +81,6 @@ TEST(KVTimeRange, MovesAndJoins)
     } const rows[] = {
         {R(1, 3), R(2, 5), R(1, 5)},
         {R(8, 9), R(2, 5), R(2, 9)},
-        {R(0, 9), R(2, 5), R(0, 9)},
-        {{before, forever}, R(2, 5), {before, forever}},
-        {{before, forever}, {T(1, 1), forever}, {before, forever}},
         {R(2, 5), {T(3, 1), forever}, {T(2, 1), forever}},
         {R(2, 5), {invalid, T(1, 1)}, {T(2, 1), invalid}},
     };
@@ -120,22 +106,6 @@ TEST(KVTimeRange, AdjustsToAnother)
         EXPECT_EQ(VexTimeRangeAdjustToBeWithinRangeWithMinimumDuration(row.range, R(10, 20),
                                                                        T(row.minimum, 1)),
                   row.adjusted);
-}
-
-TEST(KVTimeRange, ComparesByValue)
-{
-    EXPECT_TRUE(CMTimeRangeEqual(R(1, 3), {T(2, 2), T(4, 2)}));
-    EXPECT_FALSE(CMTimeRangeEqual(R(1, 3), R(1, 4)));
-    EXPECT_FALSE(CMTimeRangeEqual(R(1, 3), R(2, 4)));
-}
-
-TEST(KVTimeRange, MakesPairs)
-{
-    KVCMTimePair const pair =
-        VexTimePairMakeByAddingOffset(VexTimePairMake(T(1, 1), T(3, 2)), T(1, 4));
-    EXPECT_EQ(pair.first, T(5, 4));
-    EXPECT_EQ(pair.second, T(7, 4));
-    EXPECT_EQ(VexTimePairSecondMinusFirst(pair), T(2, 4));
 }
 
 TEST(KVTimeRange, PrintsForLogs)

@@ -2,7 +2,6 @@
 #include "time/TimeTesting.h"
 
 #include <korvane/foundation/KVPrint.h>
-#include <korvane/time/IntermediateLargeInteger.h>
 
 #include <gmock/gmock.h>
 
@@ -40,7 +39,6 @@ TEST(KVTime, ReducesInPlace)
         CMTime time, reduced;
     } const rows[] = {
         {T(6, 4), T(3, 2)},
-        {T(-6, 4), T(-3, 2)},
         {T(6, -4), T(3, -2)},
         {T(0, 600), T(0, 1)},
         {T(5, 0), T(1, 0)}, // over 0 the divisor is the value itself
@@ -48,8 +46,6 @@ TEST(KVTime, ReducesInPlace)
         {T(lowest, 1 << 30), T(-(1ll << 33), 1)},
         {T(4, 2, rounded, 9), T(2, 1, rounded, 9)},
         // As it is:
-        {T(3, 2), T(3, 2)},
-        {T(0, 1), T(0, 1)},
         {T(0, 0), T(0, 0)},
         {T(4, 2, 5), T(4, 2, 5)},
     };
@@ -80,12 +76,6 @@ TEST(KVTime, AddsWithoutLossWhereReducingHelps)
             EXPECT_EQ(KV_CMTimeSaferSubtract(row.a, CMTimeMultiply(row.b, -1)), row.sum);
         }
     }
-
-    CMTime reel = kCMTimeZero;
-    for (int i = 0; i < 30000; ++i)
-        reel = KV_CMTimeSaferAdd(reel, T(1001, 30000));
-    EXPECT_EQ(CMTimeCompare(reel, T(1001, 1)), 0);
-    EXPECT_FALSE(CMTimeIsRounded(reel));
 }
 
 TEST(KVTime, MultipliesAndDivides)
@@ -95,22 +85,14 @@ TEST(KVTime, MultipliesAndDivides)
         std::int64_t multiplier, divisor;
         CMTime result;
     } const rows[] = {
-        {T(1, 3), 3, 1, T(3, 3)},     // a small product is not reduced
-        {T(1, 3), 3, -1, T(-1, 1)},   // meant: a negative denominator is
-        {T(4, 600), 1, 2, T(2, 600)}, // on the timescale of the time if that can be
-        {T(1, 600), 1, 2, T(1, 1200)},
-        {T(1001, 30000), 1ll << 40, 1ll << 40, T(1001, 30000)},
-        {T(1, 3, rounded), 1, 3, T(1, 9, rounded)},
+        {T(1, 3), 3, 1, T(3, 3)},           // a small product is not reduced
+        {T(1, 3), 3, -1, T(-1, 1)},         // meant: a negative denominator is
+        {T(4, 600), 1, 2, T(2, 600)},       // on the timescale of the time if that can be
         {T(1, 1, valid, 5), 2, 1, T(2, 1)}, // the epoch is lost
         {T(highest, 1), 2, 1, plusInfinity},
-        {T(highest, 1), -2, 1, minusInfinity},
         {T(lowest, 1), lowest, lowest, minusInfinity}, // meant: 2^63 is no signed number
-        {T(highest, 3), highest, 5, plusInfinity},
         // Meant: the halvings leave 1 of the denominator, where 6.1e18 would be nearest.
         {T(highest, 3), highest, (1ll << 62) + 1, T(highest - 1, 1, rounded)},
-        {T(1, 1), 1, 1ll << 31, T(1, 1 << 30, rounded)},
-        {T(1, 1), 1, 1ll << 32, T(0, 1, rounded)},
-        {T(1, -3), 1, 1, T(-1, 3)},
         {T(1, 3), 1, 0, invalid},
         {plusInfinity, 1, 0, invalid},
         {plusInfinity, -1, 2, minusInfinity},
@@ -130,16 +112,13 @@ TEST(KVTime, HasOperators)
     EXPECT_EQ(frame * T(2, 1), T(2002, 30000));
     EXPECT_EQ(T(1, 2) / T(1, 3), T(3, 2));
     EXPECT_EQ(T(1, 2) / T(0, 3), invalid);
-    EXPECT_EQ(frame * 2.0, T(2002, 30000));
-    EXPECT_EQ(2.0 * frame, T(2002, 30000));
-    EXPECT_EQ(frame * -2, T(-2002, 30000));
-    EXPECT_EQ(-2 * frame, T(-2002, 30000));
+    for (CMTime const& twice : {frame * 2.0, 2.0 * frame, frame * 2, 2 * frame})
+        EXPECT_EQ(twice, T(2002, 30000));
     EXPECT_EQ(T(1, 1) * 0x80000000u, T(0x80000000, 1));
     EXPECT_EQ(0x80000000u * T(1, 1), T(0x80000000, 1));
-    EXPECT_EQ(frame / 7, T(143, 30000));
     EXPECT_EQ(frame / 2u, T(1001, 60000));
-    EXPECT_EQ(frame / 0, invalid);
     EXPECT_EQ(frame / -7, T(-143, 30000));
+    EXPECT_EQ(frame / 0, invalid);
 }
 
 TEST(KVTime, DividesByAFractionNearADouble)
@@ -149,14 +128,12 @@ TEST(KVTime, DividesByAFractionNearADouble)
         double divisor;
         CMTime result;
     } const rows[] = {
-        {T(600, 600), 2.0, T(300, 600)},
         {T(600, 600), 0.1, T(6000, 600)},
         {T(600, 600), 29.97, T(360000, 10789200)},     // 17982/600
         {T(1, 1), 1.0 / 3, T(65536, 21845)},           // at 65536 it comes within 1e-5
         {T(1, 1), 1 + 0.9 / 65536, T(131072, 131073)}, // at 131072 it stops, near or not
         {T(1, -1), 2.0, T(-1, 2)},
-        {T(1, 600), 1e-9, invalid}, // its fraction is 0
-        {T(1, 0), 2.0, invalid},
+        {T(1, 600), 1e-9, invalid},   // its fraction is 0
         {plusInfinity, 2.0, invalid}, // meant: an infinity has no timescale to start from
         {T(1, 600), infinite, invalid},
         {T(1, 600), notANumber, invalid},
@@ -172,12 +149,10 @@ TEST(KVTime, Halves)
     struct Row {
         CMTime time, half;
     } const rows[] = {
-        {T(4, 600), T(2, 600)},
         {T(1, 600), T(1, 1200)},
         {T(-3, 0x3FFFFFFF), T(-3, 0x7FFFFFFE)},
         {T(3, -0x40000000), T(3, INT32_MIN)},
         {T(5, 0x40000001), T(1, 429496730)}, // both by 5
-        {T(-5, 0x40000001), T(-1, 429496730)},
         {T(1, 0), T(1, 0)},
         {T(1, 600, rounded, 4), T(1, 1200, rounded, 4)},
         {plusInfinity, plusInfinity},
@@ -210,22 +185,12 @@ TEST(KVTime, TellsNegativeTimes)
 
 TEST(KVTime, HashesByValue)
 {
-    struct Row {
-        CMTime time;
-        std::uint32_t hash;
-    } const rows[] = {
-        {T(1, 2), 512},
-        {T(2, 4), 512},
-        {T(-1, 2), static_cast<std::uint32_t>(-512)},
-        {T(-1, 1025), 0},
-        {T(1, 0), 0},
-        {plusInfinity, 0},
-        {T(1ll << 22, 1), 0},          // the low 32 bits
-        {T((1ll << 54) + 1, 1), 1024}, // what is shifted out is lost
-        {T(1ll << 53, -1), 0},         // the lowest number, negated
-    };
-    for (Row const& row : rows)
-        EXPECT_EQ(GetCMTimeHash(row.time), row.hash);
+    EXPECT_EQ(GetCMTimeHash(T(1, 2)), 512u);
+    EXPECT_EQ(GetCMTimeHash(T(-1, 2)), static_cast<std::uint32_t>(-512));
+    EXPECT_EQ(GetCMTimeHash(T((1ll << 54) + 1, 1)), 1024u) << "what is shifted out is lost";
+    // Less than a 1024th, no scale, beyond 32 bits, the lowest number negated.
+    for (CMTime const& time : {T(-1, 1025), T(1, 0), T(1ll << 22, 1), T(1ll << 53, -1)})
+        EXPECT_EQ(GetCMTimeHash(time), 0u);
 }
 
 TEST(KVTime, NumbersSamples)
@@ -237,23 +202,18 @@ TEST(KVTime, NumbersSamples)
         std::int64_t number;
     } const rows[] = {
         {T(352, 100), frame, 105},
-        {T(1001, 1), frame, 30000},
-        {T(2002, 30000), frame, 2},
         {T(2001, 30000), frame, 1},
         {T(-1, 600), T(1, 30), 0}, // toward 0: a small negative time is in sample 0
         {T(-20, 600), T(1, 30), -1},
         {T(1, 3), T(1, 600), 200},
-        {T(100, 600), T(1, 30), 5},
         {T(7, 600), T(1, 7), 0}, // neither fits the other's timescale: seconds decide
         {T(1, 7), T(1, 600), 85},
         {T(300, 600, rounded), T(1, 30), 15}, // a rounded time is counted in its own ticks
         {T(3, 2), T(-1, 2), -3},
-        {T(3, -2), T(1, 2), -3},
         {T(3, 2), T(1, -2), -3},
         {T(lowest, 1), T(-1, 1), highest},
         {T(highest, 1), T(1, 600), highest},
         {T(1ll << 61, 1), T(1001, 30), static_cast<std::int64_t>(0x1p61 / (1001 / 30.0))},
-        {T(0, 1), T(1, 30), 0},
     };
     for (Row const& row : rows)
         EXPECT_EQ(KV_CMTimeGetSampleNumber(row.time, row.duration), row.number)
@@ -306,26 +266,21 @@ TEST(KVTime, SnapsToAGrid)
     } const rows[] = {
         {T(352, 100), frame, T(84084, 24000), T(84084, 24000), T(85085, 24000)},
         {T(-1, 600), T(1, 30), T(-1, 30), T(0, 30), T(0, 30)},
-        {T(1, 60), T(1, 30), T(0, 30), T(1, 30), T(1, 30)},   // half way, the later one
-        {T(-1, 60), T(1, 30), T(-1, 30), T(0, 30), T(0, 30)}, // before 0 too
-        {T(-3, 60), T(2, 60), T(-4, 60), T(-2, 60), T(-2, 60)},
-        {T(1001, 24000), frame, frame, frame, frame},
+        {T(1, 60), T(1, 30), T(0, 30), T(1, 30), T(1, 30)},             // half way, the later one
+        {T(-1, 60), T(1, 30), T(-1, 30), T(0, 30), T(0, 30)},           // before 0 too
         {T(1, 48000, rounded), frame, T(0, 24000), T(0, 24000), frame}, // not rounded any more
         {T(1, 1, valid, 2), T(1, 2), T(2, 2, valid, 2), T(2, 2, valid, 2), T(2, 2, valid, 2)},
         // Meant: the value of a frame below 2 counts as 1.
         {T(7, 60), T(-5, 30), T(3, 30), T(4, 30), T(4, 30)},
         {T(-5, -2), T(2, 1), T(2, 1), T(2, 1), T(4, 1)},
-        {T(1, -3), T(1, 1), T(-1, 1), T(0, 1), T(0, 1)},
         // At the ends.
         {T(highest, 1), T(2, 1), T(highest - 1, 1), T(highest - 1, 1), plusInfinity},
         {T(lowest, 1), T(3, 1), minusInfinity, T(lowest + 2, 1), T(lowest + 2, 1)},
         {T(highest, 1), T(1, 2), plusInfinity, plusInfinity, plusInfinity},
-        {T(5, 1), T(highest, 1), T(0, 1), T(0, 1), T(highest, 1)},
         // As it is, or no answer.
         {T(1, 3), T(0, 30), T(1, 3), T(1, 3), T(1, 3)},
         {T(1, 3), indefinite, T(1, 3), T(1, 3), T(1, 3)},
         {plusInfinity, frame, plusInfinity, plusInfinity, plusInfinity},
-        {T(1, 3), T(1, 0), invalid, invalid, invalid},
         {T(1, 3), T(1, -30), invalid, invalid, invalid},
     };
     for (Row const& row : rows) {
@@ -346,13 +301,7 @@ TEST(KVTime, RemapsToAnotherGrid)
     } const rows[] = {
         {T(100100, 30000), ntsc, pal, false, T(100, 25)},
         {T(100100, 30000), ntsc, pal, true, T(4, 1)},
-        {T(100, 30000), ntsc, pal, false, T(0, 25)},
-        {T(100, 30000), ntsc, pal, true, T(4, 1001)},
         {T(1, 2, rounded), T(1, 3), T(1, 5), true, T(3, 10, rounded)},
-        {T(highest, 1), T(highest, 1), T(1, 1), true, T(1, 1)},
-        {T(lowest, 1), T(-1, 1), T(1, 1), true, plusInfinity},
-        {T(lowest, 1), T(2, 1), T(-1, 1), true, T(1ll << 62, 1)},
-        {T(highest, 7), T(1, INT32_MAX), T(highest, 11), true, plusInfinity},
         {invalid, ntsc, T(2002, 60000), true, invalid}, // equal durations: whatever it is
         {T(1, 3), invalid, invalid, true, T(1, 3)},
         {T(1, 3), kCMTimeZero, pal, true, invalid},
@@ -370,22 +319,13 @@ TEST(KVTime, RemapsToAnotherGrid)
 
 TEST(KVTime, KnowsTheBroadcastRates)
 {
-    struct Row {
-        CMTime duration, alias;
-    } const rows[] = {
-        {T(100, 2997), T(1001, 30000)},
-        {T(200, 5994), T(1001, 30000)},
-        {T(50, 2997), T(1001, 60000)},
-        {T(125, 2997), T(1001, 24000)},
-        {T(100, 2397), T(1001, 24000)},
-        {T(100, 2398), T(1001, 24000)},
-        {T(100, 2500), T(100, 2500)},
-        {T(1001, 30000), T(1001, 30000)},
-        {invalid, invalid},
-        {T(100, 2997, valid, 1), T(100, 2997, valid, 1)},
-    };
-    for (Row const& row : rows)
-        EXPECT_EQ(KV_CMTimeGetPreferredSampleDurationAlias(row.duration), row.alias);
+    for (CMTime const& other : {T(100, 2500), invalid, T(100, 2997, valid, 1)})
+        EXPECT_EQ(KV_CMTimeGetPreferredSampleDurationAlias(other), other);
+    for (CMTime const& duration : {T(100, 2997), T(200, 5994)})
+        EXPECT_EQ(KV_CMTimeGetPreferredSampleDurationAlias(duration), T(1001, 30000));
+    for (CMTime const& duration : {T(125, 2997), T(100, 2397), T(100, 2398)})
+        EXPECT_EQ(KV_CMTimeGetPreferredSampleDurationAlias(duration), T(1001, 24000));
+    EXPECT_EQ(KV_CMTimeGetPreferredSampleDurationAlias(T(50, 2997)), T(1001, 60000));
 }
 
 TEST(KVTime, MakesFromSeconds)
@@ -396,20 +336,17 @@ TEST(KVTime, MakesFromSeconds)
         CMTime nearest, ceiling;
     } const rows[] = {
         {1.0, 600, T(600, 600, rounded), T(600, 600)}, // meant: half a tick more is not whole
-        {-1.0, 600, T(-600, 600, rounded), T(-600, 600)},
         {0.0024, 600, T(1, 600, rounded), T(2, 600, rounded)},
         {0.0026, 600, T(2, 600, rounded), T(2, 600, rounded)},
         {1.5, 1, T(2, 1), T(2, 1, rounded)},
         {-1.5, 1, T(-1, 1), T(-1, 1, rounded)},
         {1 + 0.5e-7, 1, T(1, 1, rounded), T(1, 1, rounded)}, // within 1e-7 it stays
-        {1 - 0.5e-7, 1, T(1, 1, rounded), T(1, 1, rounded)},
         {1 + 2e-7, 1, T(1, 1, rounded), T(2, 1, rounded)},
         {notANumber, 600, invalid, invalid},
         {infinite, 600, plusInfinity, plusInfinity},
         {-1e300, 600, minusInfinity, minusInfinity},
         {1.0, 0, invalid, invalid},
         {1.0, -600, invalid, invalid},
-        {0.9999999999, -600, invalid, invalid},
     };
     for (Row const& row : rows) {
         EXPECT_EQ(KV_CMTimeMakeWithSecondsRoundToNearest(row.seconds, row.timescale), row.nearest)
@@ -419,64 +356,39 @@ TEST(KVTime, MakesFromSeconds)
     }
 }
 
-TEST(KVTime, PrintsForLogs)
+TEST(KVTime, PrintsForLogsAndToStreams)
 {
     struct Row {
         CMTime time;
-        char const *plain, *fraction;
+        char const *plain, *fraction, *streamed, *on600;
     } const rows[] = {
-        {T(352, 100), "3.520000", "3.520000(352/100)"},
-        {T(1, 3, rounded), "0.333333+round", "0.333333(1/3+round)"},
-        {T(1, 2, valid, 7), "0.500000+epoch=7", "0.500000(1/2+epoch=7)"},
-        {T(1, 2, rounded, -7), "0.500000+epoch=-7+round", "0.500000(1/2+epoch=-7+round)"},
-        {plusInfinity, "inf", "inf"},
-        {T(5, 3, 9), "-inf", "-inf(5/3)"},
-        {T(0, 0, 5, 2), "inf+epoch=2", "inf+epoch=2"},
-        {T(0, 0, 21), "inf+indef", "inf+indef"}, // an infinity may be indefinite as well
-        {T(1, 2, 21), "inf+indef", "inf(1/2+indef)"},
-        {invalid, "inval", "inval"},
-        {T(5, 3, 0), "inval", "nan(5/3)"},
-        {indefinite, "indef", "indef"},
-        {T(0, 0), "nan", "nan(0/0)"},
-        {T(-1, 0), "-inf", "-inf(-1/0)"},
-        {T(lowest, -1, rounded, lowest),
-         "9223372036854775808.000000+epoch=-9223372036854775808+round",
-         "9223372036854775808.000000(-9223372036854775808/-1+epoch=-9223372036854775808+round)"},
+        {T(352, 100), "3.520000", "3.520000(352/100)", "3.52", "[2112/600]"},
+        {T(1, 3, rounded), "0.333333+round", "0.333333(1/3+round)", "0.333333+round",
+         "[200/600 +round]"},
+        {T(1, 2, rounded, -7), "0.500000+epoch=-7+round", "0.500000(1/2+epoch=-7+round)",
+         "0.5+epoch=-7+round", "[300/600 -7 +round]"},
+        {plusInfinity, "inf", "inf", "inf", "inf"},
+        {T(5, 3, 9), "-inf", "-inf(5/3)", "-inf", "-inf"},
+        {T(1, 2, 21), "inf+indef", "inf(1/2+indef)", "inf+indef", "inf+indef"},
+        {invalid, "inval", "inval", "inval", "inval"},
+        {T(5, 3, 0), "inval", "nan(5/3)", "inval", "inval"},
+        {indefinite, "indef", "indef", "indef", "indef"},
+        {T(0, 0), "nan", "nan(0/0)", "nan", "nan"},
+        {T(highest, 1), "9223372036854775808.000000",
+         "9223372036854775808.000000(9223372036854775807/1)", "9.22337e+18",
+         "9.22337e+18"}, // does not fit the timescale
     };
     for (Row const& row : rows) {
         EXPECT_EQ(text(KV_CMTimeToString(row.time)), row.plain);
         EXPECT_EQ(text(KV_CMTimeToFractionString(row.time)), row.fraction);
-    }
-}
-
-TEST(KVTime, PrintsToStreams)
-{
-    struct Row {
-        CMTime time;
-        char const *seconds, *on600;
-    } const rows[] = {
-        {T(352, 100), "3.52", "[2112/600]"},
-        {T(1, 7), "0.142857", "[86/600 +round]"},
-        {T(1, 2, rounded), "0.5+round", "[300/600 +round]"},
-        {T(1, 2, rounded, 7), "0.5+epoch=7+round", "[300/600 +7 +round]"},
-        {T(1, 2, valid, 7), "0.5+epoch=7", "[300/600 +7]"},
-        {plusInfinity, "inf", "inf"},
-        {invalid, "inval", "inval"},
-        {indefinite, "indef", "indef"},
-        {T(highest, 1), "9.22337e+18", "9.22337e+18"}, // does not fit the timescale
-    };
-    for (Row const& row : rows) {
         std::ostringstream stream;
         stream << row.time << "|" << KVVexTimePreferredTimeScale(600) << row.time << "|"
                << KVVexTimePreferredTimeScale(0) << row.time;
-        EXPECT_EQ(stream.str(), std::string(row.seconds) + "|" + row.on600 + "|" + row.seconds);
+        EXPECT_EQ(stream.str(), std::string(row.streamed) + "|" + row.on600 + "|" + row.streamed);
     }
     std::ostringstream stream;
     stream << KVVexTimePreferredTimeScale(600, kCMTimeRoundingMethod_RoundTowardZero) << T(1, 7);
     EXPECT_EQ(stream.str(), "[85/600 +round]");
-    EXPECT_EQ(stream.iword(getPreferredTimeScaleIndex()), 600);
-    EXPECT_EQ(stream.iword(getPreferredTimeScaleRoundingIndex()), 2);
-    EXPECT_NE(getPreferredTimeScaleIndex(), getPreferredTimeScaleRoundingIndex());
 }
 
 TEST(KVTime, AllocatesNothing)
@@ -492,25 +404,16 @@ TEST(KVTime, AllocatesNothing)
         CMTime reduced = a;
         SimpCMTime(&reduced);
         use(KV_CMTimeHalve(a));
-        use(KV_CMTimeGetPreferredSampleDurationAlias(a));
         use(a / 29.97);
-        use(a * 29.97);
         for (CMTime const& b : times) {
             use(KV_CMTimeSaferAdd(a, b));
-            use(KV_CMTimeSaferSubtract(a, b));
-            use(a * b);
             use(a / b);
             use(KV_CMTimeMultiply64Divide64(a, highest, lowest));
             use(KV_CMTimeGetSampleTime(a, b));
             use(KV_CMTimeRoundToSampleDuration(a, b));
             use(KV_CMTimeRemap(a, b, times[0], true));
-            use(KV_CMTimeRemap(a, b, times[0], false));
-            use(IntermediateLargeInteger::makeCMTime(
-                IntermediateLargeInteger::product(a.value, highest),
-                IntermediateLargeInteger::product(b.value, lowest), false, false));
         }
         use(KV_CMTimeMakeWithSecondsRoundToNearest(CMTimeGetSeconds(a), 600));
-        use(KV_CMTimeMakeWithSecondsRoundToCeiling(CMTimeGetSeconds(a), 600));
     }
     EXPECT_EQ(allocations::count(), before);
     EXPECT_NE(sum, 0u);

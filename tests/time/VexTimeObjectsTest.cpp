@@ -2,18 +2,23 @@
 
 #include <korvane/korvane.h>
 
+#include <stdexcept>
+
 using namespace timetest;
 
 namespace {
 
 /// Archives, reads the bytes back and decodes the one object.
 template <class T>
-KVNSRef<T*> archived(T const& object)
+KVNSRef<T*> archived(T const& original)
 {
     KVKeyedCoder writer;
-    writer.encodeObject(&object, "object");
-    auto reader = KVKeyedCoder::fromBytes(writer.archivedBytes());
-    return reader ? reader->template decodeObjectOfClass<T>(T::coding, "object") : nullptr;
+    writer.encodeObject(&original, "object");
+    auto const object = KVKeyedCoder::fromBytes(writer.archivedBytes())
+                            ->template decodeObjectOfClass<T>(T::coding, "object");
+    if (!object)
+        throw std::runtime_error("not read back");
+    return object;
 }
 
 } // namespace
@@ -33,9 +38,6 @@ TEST(VexTimeObj, ComparesByValue)
     EXPECT_EQ(half->compareWithTime(T(3, 6)), kCFCompareEqualTo);
     EXPECT_EQ(half->compare(nullptr), kCFCompareGreaterThan);
     EXPECT_EQ(text(half->description()), "0.500000");
-    CMTime value;
-    half->getValue(&value);
-    EXPECT_EQ(value, T(1, 2));
 }
 
 TEST(VexTimeObj, EqualTimesHashAlikeAtTheEnds)
@@ -60,58 +62,42 @@ TEST(VexTimeRangeObj, HasEndsThatCanBeSet)
     EXPECT_EQ(range->range(), R(12, 12));
     range->setDuration(T(-1, 1));
     EXPECT_EQ(range->duration(), T(0, 1));
+    auto const copy = KVNSRef<NSObject*>::adopt(range->newCopy());
     range->setRange(R(1, 2));
-    CMTimeRange value;
-    range->getValue(&value);
-    EXPECT_EQ(value, R(1, 2));
+    EXPECT_FALSE(copy->isEqual(range));
     EXPECT_EQ(text(range->description()), "[1.000000, 2.000000)");
 }
 
 TEST(VexTimeRangeObj, SortsByStart)
 {
-    auto const early = VexTimeRangeObj::initWithCMTimeRange(R(1, 9)),
-               late = VexTimeRangeObj::initWithVexTimeRange(R(2, 3));
+    auto const early = KVMakeRef<VexTimeRangeObj>(R(1, 9)),
+               late = KVMakeRef<VexTimeRangeObj>(R(2, 3));
     EXPECT_EQ(early->sortByStartTimeAscending(late), kCFCompareLessThan);
     EXPECT_EQ(early->sortByStartTimeDescending(late), kCFCompareGreaterThan);
-    EXPECT_EQ(early->sortByStartTimeAscending(early), kCFCompareEqualTo);
     EXPECT_EQ(early->sortByStartTimeAscending(nullptr), kCFCompareGreaterThan);
     EXPECT_EQ(early->sortByStartTimeDescending(nullptr), kCFCompareLessThan);
 }
 
-TEST(VexTimeRangeObj, CopiesAreApart)
-{
-    auto const range = KVMakeRef<VexTimeRangeObj>(R(1, 2));
-    auto const copy = KVNSRef<NSObject*>::adopt(range->newCopy());
-    range->setStart(T(5, 1));
-    EXPECT_TRUE(copy->isEqual(KVMakeRef<VexTimeRangeObj>(R(1, 2))));
-    auto const pair = KVMakeRef<VexTimePairObj>(T(1, 1), T(2, 1));
-    auto const pairCopy = KVNSRef<NSObject*>::adopt(pair->newCopy());
-    pair->setFirst(T(0, 1));
-    EXPECT_FALSE(pairCopy->isEqual(pair));
-}
-
 TEST(VexTimePairObj, HoldsTwoTimes)
 {
-    auto const pair = VexTimePairObj::pairWithPair(VexTimePairMake(T(1, 2), T(3, 4)));
-    EXPECT_TRUE(pair->isEqual(KVMakeRef<VexTimePairObj>(T(2, 4), T(6, 8))));
-    EXPECT_EQ(pair->hash(), KVMakeRef<VexTimePairObj>(T(2, 4), T(6, 8))->hash());
+    auto const pair = VexTimePairObj::pairWithPair(
+        VexTimePairMakeByAddingOffset(VexTimePairMake(T(1, 4), T(1, 2)), T(1, 4)));
+    EXPECT_EQ(VexTimePairSecondMinusFirst(pair->pair()), T(1, 4));
+    auto const equal = KVMakeRef<VexTimePairObj>(T(2, 4), T(6, 8));
+    EXPECT_TRUE(pair->isEqual(equal));
+    EXPECT_EQ(pair->hash(), equal->hash());
     EXPECT_FALSE(pair->isEqual(KVMakeRef<VexTimePairObj>(T(3, 4), T(1, 2))));
     EXPECT_EQ(text(pair->description()), "(0.500000, 0.750000)");
-    pair->setSecond(T(9, 1));
-    KVCMTimePair value;
-    pair->getValue(&value);
-    EXPECT_EQ(value.second, T(9, 1));
-    pair->setPair({T(1, 1), T(2, 1)});
-    EXPECT_EQ(pair->pair().first, T(1, 1));
+    auto const copy = KVNSRef<NSObject*>::adopt(pair->newCopy());
+    pair->setFirst(T(0, 1));
+    EXPECT_FALSE(copy->isEqual(pair));
 }
 
 TEST(VexTimeRangeAndObject, BelongsToItsObject)
 {
     KVString const name("clip");
     auto const range = VexTimeRangeAndObject::rangeAndObjectWithRange(R(1, 3), name.cf_str());
-    EXPECT_EQ(range->object(), name.cf_str());
     EXPECT_EQ(range->representedToolObject(), name.cf_str());
-    EXPECT_EQ(range->startTimeObject()->time(), T(1, 1));
     EXPECT_EQ(range->durationObject()->time(), T(2, 1));
     EXPECT_EQ(text(range->description()), "[1.000000, 3.000000) clip");
 
@@ -136,7 +122,6 @@ TEST(CMTimeRangeAndNonretainedObject, DoesNotRetain)
     EXPECT_EQ(object->retainCount(), 1u);
     EXPECT_EQ(range->object(), object.get());
     auto const back = archived(*range);
-    ASSERT_TRUE(back);
     EXPECT_EQ(back->range(), R(1, 3));
     EXPECT_EQ(back->object(), nullptr);
 }
@@ -145,25 +130,16 @@ TEST(VexTimeCoding, KeepsEveryField)
 {
     CMTime const time = T(-1001, 24000, rounded, 7);
     CMTimeRange const range = {time, T(5, 3)};
-    auto const timeObject = archived(VexTimeObj(time));
-    ASSERT_TRUE(timeObject);
-    EXPECT_EQ(timeObject->time(), time);
+    EXPECT_EQ(archived(VexTimeObj(time))->time(), time);
     auto const pair = archived(VexTimePairObj(time, kCMTimePositiveInfinity));
-    ASSERT_TRUE(pair);
     EXPECT_EQ(pair->first(), time);
     EXPECT_EQ(pair->second(), kCMTimePositiveInfinity);
-    auto const rangeObject = archived(VexTimeRangeObj(range));
-    ASSERT_TRUE(rangeObject);
-    EXPECT_EQ(rangeObject->range(), range);
-
+    EXPECT_EQ(archived(VexTimeRangeObj(range))->range(), range);
     auto const boxed = KVMakeRef<VexTimeObj>(T(1, 1));
     auto const owned = archived(VexTimeRangeAndObject(range, boxed));
-    ASSERT_TRUE(owned);
     EXPECT_EQ(owned->range(), range);
     EXPECT_TRUE(CFEqual(owned->object(), boxed));
-    auto const alone = archived(VexTimeRangeAndObject(range, nullptr));
-    ASSERT_TRUE(alone);
-    EXPECT_EQ(alone->object(), nullptr);
+    EXPECT_EQ(archived(VexTimeRangeAndObject(range, nullptr))->object(), nullptr);
 }
 
 TEST(VexTimeCoding, RefusesWhatIsNoTime)

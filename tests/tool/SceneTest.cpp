@@ -3,6 +3,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <sstream>
+
 using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::StartsWith;
@@ -31,8 +33,13 @@ std::string const everyKind =
 
 } // namespace
 
-TEST(SceneShow, DrawsTheTree)
+TEST(SceneShow, DrawsTheTreeOrSpeaksJson)
 {
+    std::string const json = runTool({"scene", "show", "--json", "-"}, everyKind).out;
+    for (char const* text :
+         {"\"digest\": 18446744073709551615", "\"content\": \"nan\"", "\"timescale\": -2147483648"})
+        EXPECT_THAT(json, HasSubstr(text));
+
     ToolResult const result = runTool(
         {"scene", "show", "-"}, document("<project name=\"P\"><note>one\ntwo</note><group><clip "
                                          "track=\"-1\"/></group></project><group/>"));
@@ -42,15 +49,6 @@ TEST(SceneShow, DrawsTheTree)
                           "\u2514\u2500 group\n"
                           "   \u2514\u2500 clip track=-1\n"
                           "group\n");
-}
-
-TEST(SceneShow, SpeaksJson)
-{
-    ToolResult const result = runTool({"scene", "show", "--json", "-"}, everyKind);
-    EXPECT_EQ(result.exitCode, 0) << result.messages;
-    EXPECT_THAT(result.out, HasSubstr("\"digest\": 18446744073709551615"));
-    EXPECT_THAT(result.out, HasSubstr("\"content\": \"nan\""));
-    EXPECT_THAT(result.out, HasSubstr("\"timescale\": -2147483648"));
 }
 
 TEST(SceneCheck, NamesWhatIsWrongAndWhere)
@@ -76,24 +74,42 @@ TEST(SceneCheck, NamesWhatIsWrongAndWhere)
 TEST(SceneConvert, GoesBetweenTheFormsWithoutLoss)
 {
     ScratchFolder const folder;
-    for (std::string const& text : {everyKind, folder.read(showreel)}) {
-        std::string const in = folder.write("in.vzml", text);
-        auto convert = [&](std::string const& from, std::string const& to, char const* form) {
-            ToolResult const result = runTool({"scene", "convert", "--to", form, from, to});
+    std::vector<std::string> documents = {everyKind, folder.read(showreel)};
+    // The same text in every field, of whatever kind, where encodings change.
+    std::istringstream edges(
+        "-1 -2 127 128 255 256 -256 65536 16777217 2147483648 -2147483648 4294967296 -4294967296 "
+        "1099511627776 9007199254740993 9223372036854775808 0.1 -0 -nan 1e39 1e400 "
+        "2.2250738585072014e-308 0x1p-3 12abc &amp;lt; \u4E16\U0001F600");
+    for (std::string edge; edges >> edge;) {
+        std::string clip = "<clip name='$' id='$' start='$' track='$' digest='$'><source>$</source>"
+                           "<reel>$</reel><in>$</in><length>$</length><bytes>$</bytes>"
+                           "<lane>$</lane><flags>$</flags><gain>$</gain><opacity>$</opacity>"
+                           "<transform x='$'/></clip>";
+        for (std::size_t at; (at = clip.find('$')) != std::string::npos;)
+            clip.replace(at, 1, edge);
+        documents.push_back(document(clip));
+    }
+    for (std::string const& text : documents) {
+        SCOPED_TRACE(text);
+        auto const convert = [&](char const* from, char const* to, char const* form) {
+            ToolResult const result =
+                runTool({"scene", "convert", "--to", form, folder.path(from), folder.path(to)});
             EXPECT_EQ(result.exitCode, 0) << result.messages;
         };
-        convert(in, folder.path("text"), "text");
-        convert(in, folder.path("binary"), "binary");
-        convert(folder.path("binary"), folder.path("back"), "text");
-        convert(folder.path("text"), folder.path("again"), "text");
+        folder.write("in", text);
+        convert("in", "text", "text");
+        convert("in", "binary", "binary");
+        convert("binary", "back", "text");
+        convert("text", "again", "text");
         EXPECT_THAT(folder.read("binary"), StartsWith("VZBML"));
         EXPECT_EQ(folder.read("back"), folder.read("text"));
         EXPECT_EQ(folder.read("again"), folder.read("text"));
-
-        std::string const hash = runTool({"scene", "hash", folder.path("text")}).out.substr(0, 32);
-        EXPECT_EQ(runTool({"scene", "hash", folder.path("binary")}).out.substr(0, 32), hash);
+        EXPECT_EQ(runTool({"scene", "hash", folder.path("binary")}).out.substr(0, 32),
+                  runTool({"scene", "hash", folder.path("text")}).out.substr(0, 32));
+        if (text == documents[1]) {
+            EXPECT_EQ(folder.read("text"), text) << "the sample is in its normal form";
+        }
     }
-    EXPECT_EQ(folder.read(showreel), folder.read("text")); // the sample is in its normal form
 }
 
 TEST(SceneConvert, LeavesNothingBehindWhenItFails)
@@ -103,7 +119,6 @@ TEST(SceneConvert, LeavesNothingBehindWhenItFails)
     EXPECT_EQ(missing.exitCode, 4);
     EXPECT_THAT(missing.messages, HasSubstr(folder.path("no/out")));
     EXPECT_EQ(runTool({"scene", "convert", showreel, "/dev/full"}).exitCode, 4);
-    EXPECT_EQ(runShell("\"$KORVANE\" scene show '" + showreel + "' >/dev/full").exitCode, 4);
     EXPECT_EQ(runShell("\"$KORVANE\" scene convert '" + showreel + "' - >&-").exitCode, 4);
     std::string const bad = folder.write("bad", "<vzml><clip>");
     folder.write("out", "kept");
@@ -116,10 +131,10 @@ TEST(Scene, RefusesWhatIsNoDocument)
 {
     ScratchFolder const folder;
     std::string bomb = "<!DOCTYPE vzml [<!ENTITY a \"aaaaaaaaaa\">";
-    for (char c = 'b'; c < 'k'; ++c)
-        bomb += std::string("<!ENTITY ") + c + " \"" +
-                std::string(3, '&').replace(1, 1, 1, static_cast<char>(c - 1)).replace(2, 1, ";") +
-                "\">";
+    for (char c = 'b'; c < 'k'; ++c) {
+        std::string const before = std::string("&") + static_cast<char>(c - 1) + ";";
+        bomb += std::string("<!ENTITY ") + c + " \"" + before + before + "\">";
+    }
     bomb += "]><vzml><clip name=\"&j;&j;\"/></vzml>";
     struct Row {
         char const* name;
@@ -129,29 +144,18 @@ TEST(Scene, RefusesWhatIsNoDocument)
         {"empty", "", ": the file is empty"},
         {"words", "hello", ":1: "},
         {"cut", "<vzml>\n<clip name=\"x\">\n", ":2: "},
-        {"crossed", "<vzml><clip></note></vzml>", ":1: "},
-        {"latin", "<vzml><note>\xE9</note></vzml>", ":1: "},
         {"root", "<xml/>", ": the root element is not vzml"},
         {"newer", "<vzml version=\"2.0\"/>", ": version 2.0 is newer than this tool"},
         {"bomb", bomb, ""},
-        {"binary", "VZBML 1.0", ""},
     };
     for (Row const& row : rows) {
         std::string const path = folder.write(row.name, row.bytes);
         ToolResult const result = runTool({"scene", "show", path});
-        if (std::string_view(row.name) == "binary") {
-            EXPECT_EQ(result.exitCode, 0); // a header alone is an empty document
-            continue;
-        }
         EXPECT_EQ(result.exitCode, 3) << row.name;
         EXPECT_THAT(result.messages, HasSubstr("korvane: " + path + row.message)) << row.name;
         EXPECT_THAT(result.out, IsEmpty());
     }
-    for (std::string const& path : {folder.path("missing"), folder.path("")}) {
-        ToolResult const result = runTool({"scene", "show", path});
-        EXPECT_EQ(result.exitCode, 4);
-        EXPECT_THAT(result.messages, HasSubstr(path));
-    }
+    EXPECT_EQ(runTool({"scene", "show", "-"}, "VZBML 1.0").exitCode, 0); // an empty document
 }
 
 TEST(Scene, HoldsThreeHundredThousandLevels)

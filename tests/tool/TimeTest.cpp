@@ -7,6 +7,16 @@ using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::StartsWith;
 
+namespace {
+
+ToolResult run(char const* command, std::vector<std::string> words)
+{
+    words.insert(words.begin(), command);
+    return runTool(words);
+}
+
+} // namespace
+
 TEST(ToolTime, Calculates)
 {
     struct Row {
@@ -14,21 +24,14 @@ TEST(ToolTime, Calculates)
         char const* line;
     } const rows[] = {
         {{"1001/30000 * 30000"}, "30030000/30000 = 1001/1 = 1001.000000 s, exact"},
-        {{"1001/30000", "*", "30000"}, "30030000/30000 = 1001/1 = 1001.000000 s, exact"},
         {{"(1/2 + 0.25) / -3"}, "-1/4 = -0.250000 s, exact"},
-        {{"2 - 1 - 1/3"}, "2/3 = 0.666667 s, exact"},
         {{"6 / 3/2"}, "4/1 = 4.000000 s, exact"}, // 3/2 is one number
         {{"1/1000000007 + 1/998244353"}, "2/1000000007 = 0.000000 s, rounded"},
-        {{"1/2 * (1/1000000007 + 1/998244353)"},
-         "2/2000000014 = 1/1000000007 = 0.000000 s, rounded"},
-        {{"-1/600"}, "-1/600 = -0.001667 s, exact"},
-        {{"inf - 5"}, "inf"},
         {{"--", "-inf"}, "-inf"},
         {{"floor", "3.52", "--frame", "1001/24000"}, "84084/24000 = 7007/2000 = 3.503500 s, exact"},
         {{"ceiling", "1/3 + 1/5", "--frame", "1/24"}, "13/24 = 0.541667 s, exact"},
         {{"round", "1/48", "--frame", "1/24"}, "1/24 = 0.041667 s, exact"},
         {{"sample", "-3.52", "--frame", "1/24"}, "-84"},
-        {{"remap", "100100/30000", "1001/30000", "1/25"}, "100/25 = 4/1 = 4.000000 s, exact"},
         {{"remap", "100/30000", "1001/30000", "1/25", "--exact"}, "4/1001 = 0.003996 s, exact"},
         {{"sum", "1001/30000", "--times", "1000000"},
          "1001000000/30000 = 100100/3 = 33366.666667 s, exact"},
@@ -37,9 +40,7 @@ TEST(ToolTime, Calculates)
         {{"alias", "100/2997"}, "1001/30000 = 0.033367 s, exact"},
     };
     for (Row const& row : rows) {
-        std::vector<std::string> arguments = {"time"};
-        arguments.insert(arguments.end(), row.words.begin(), row.words.end());
-        ToolResult const result = runTool(arguments);
+        ToolResult const result = run("time", row.words);
         EXPECT_EQ(result.out, std::string(row.line) + "\n") << result.messages;
         EXPECT_EQ(result.exitCode, 0);
     }
@@ -47,12 +48,17 @@ TEST(ToolTime, Calculates)
 
 TEST(ToolTime, PrintsJson)
 {
-    ToolResult const result = runTool({"time", "--json", "2/1000000007"});
-    EXPECT_THAT(result.out, HasSubstr("\"value\": 2,\n  \"timescale\": 1000000007,"));
-    EXPECT_THAT(result.out, HasSubstr("\"rounded\": false"));
-    EXPECT_THAT(runTool({"time", "--json", "inf"}).out, HasSubstr("\"kind\": \"inf\""));
-    EXPECT_THAT(runTool({"time", "--json", "sample", "1", "--frame", "1/24"}).out,
-                HasSubstr("\"sample\": 24"));
+    struct Row {
+        std::vector<std::string> words;
+        char const* text;
+    } const rows[] = {
+        {{"time", "--json", "2/1000000007"}, "\"value\": 2,\n  \"timescale\": 1000000007,"},
+        {{"time", "--json", "inf"}, "\"kind\": \"inf\""},
+        {{"time", "--json", "sample", "1", "--frame", "1/24"}, "\"sample\": 24"},
+        {{"ranges", "union", "--json", "0..3=a"}, "\"duration\": {\n        \"value\": 3,"},
+    };
+    for (Row const& row : rows)
+        EXPECT_THAT(runTool(row.words).out, HasSubstr(row.text));
 }
 
 TEST(ToolTime, ToldWhatIsWrong)
@@ -65,21 +71,15 @@ TEST(ToolTime, ToldWhatIsWrong)
         {{"1 / 0"}, 1, ""}, // the answer is: invalid
         {{"1/2 + x"}, 2, "korvane: \"1/2 + x \" is not a time (character 7)\n"},
         {{"(1"}, 2, "korvane: \"(1 \" lacks a ) (character 4)\n"},
-        {{"1 1"}, 2, "korvane: \"1 1 \" goes on where it should end (character 3)\n"},
         {{"1/0"}, 2, "korvane: \"1/0 \" is not a timescale from 1 to 2147483647 (character 3)\n"},
         {{"9223372036854775808"}, 2, "korvane: \"9223372036854775808 \" does not fit 64 bits"},
-        {{"922337203685477580.7"}, 0, ""},
         {{"9223372036854775807.1"}, 2, "korvane: \"9223372036854775807.1 \" does not fit 64 bits"},
-        {{"0.1234567891"}, 2, "korvane: \"0.1234567891 \" has more than 9 decimal places"},
         {{std::string(101, '(') + "1"}, 2, "korvane: \"(((((((((("},
         {{"floor", "1"}, 2, "korvane: floor needs --frame\n"},
         {{"remap", "1", "2"}, 2, "korvane: remap needs TIME OLD NEW\n"},
-        {{"floor", "--frame", "1/24"}, 2, "korvane: \"\" is not a time"},
     };
     for (Row const& row : rows) {
-        std::vector<std::string> arguments = {"time"};
-        arguments.insert(arguments.end(), row.words.begin(), row.words.end());
-        ToolResult const result = runTool(arguments);
+        ToolResult const result = run("time", row.words);
         EXPECT_EQ(result.exitCode, row.code) << result.messages;
         EXPECT_THAT(result.messages, StartsWith(row.message));
     }
@@ -100,27 +100,18 @@ TEST(ToolRanges, Operates)
         {{"mask", "0..10,20..30", "5..25"}, "5/1..10/1\n20/1..25/1\n"},
     };
     for (Row const& row : rows) {
-        std::vector<std::string> arguments = {"ranges"};
-        arguments.insert(arguments.end(), row.words.begin(), row.words.end());
-        ToolResult const result = runTool(arguments);
+        ToolResult const result = run("ranges", row.words);
         EXPECT_EQ(result.out, row.out) << result.messages;
         EXPECT_EQ(result.exitCode, 0);
     }
 }
 
-TEST(ToolRanges, ReadsWhatItPrinted)
+TEST(ToolRanges, ReadsAFileAndDraws)
 {
     ScratchFolder const folder;
     std::string const file =
-        folder.write("clips.txt", "# reel 1\n0..3=Ferry, wide\r\n\n  4 .. 6.5=Gulls\n");
-    ToolResult const once = runTool({"ranges", "union", file});
-    EXPECT_EQ(once.out, "0/1..3/1=Ferry, wide\n4/1..65/10=Gulls\n");
-    EXPECT_EQ(runTool({"ranges", "union", "-"}, once.out).out, once.out);
-}
-
-TEST(ToolRanges, Draws)
-{
-    ScratchFolder const folder;
+        folder.write("clips.txt", "# reel\n0..3=Ferry, wide\r\n\n 4 .. 6.5=Gulls\n");
+    EXPECT_EQ(runTool({"ranges", "union", file}).out, "0/1..3/1=Ferry, wide\n4/1..65/10=Gulls\n");
     EXPECT_EQ(
         runTool({"ranges", "subtract", "--timeline", "0..10=a,12..16=long name,1..2", "3..4,8..13"})
             .out,
@@ -142,13 +133,6 @@ TEST(ToolRanges, Draws)
     EXPECT_THAT(folder.read("picture.svg"), HasSubstr("a&lt;b&amp;&quot;c&quot;"));
 }
 
-TEST(ToolRanges, PrintsJson)
-{
-    ToolResult const result = runTool({"ranges", "union", "--json", "0..3=a"});
-    EXPECT_THAT(result.out, HasSubstr("\"duration\": {\n        \"value\": 3,"));
-    EXPECT_THAT(result.out, HasSubstr("\"name\": \"a\""));
-}
-
 TEST(ToolRanges, ToldWhatIsWrong)
 {
     ScratchFolder const folder;
@@ -160,17 +144,13 @@ TEST(ToolRanges, ToldWhatIsWrong)
     } const rows[] = {
         {{"union", "0..3,x"}, 2, "korvane: \"x\" is not START..END or START+DURATION"},
         {{"union", "3..2"}, 2, "korvane: \"3..2\" ends before it starts (character 4)\n"},
-        {{"union", "3"}, 2, "korvane: \"3\" is not START..END or START+DURATION"},
         {{"union", file}, 3, "korvane: " + file + ":3: \"\" is not a time"},
         {{"union", folder.path("none")}, 4, "korvane: " + folder.path("none") + ": No such file"},
-        {{"subtract", "0..3"}, 2, "korvane: "},
         {{"mask", "0..3", "1..2", "1..2"}, 2, "korvane: "},
         {{}, 2, "korvane: "},
     };
     for (Row const& row : rows) {
-        std::vector<std::string> arguments = {"ranges"};
-        arguments.insert(arguments.end(), row.words.begin(), row.words.end());
-        ToolResult const result = runTool(arguments);
+        ToolResult const result = run("ranges", row.words);
         EXPECT_EQ(result.exitCode, row.code) << result.messages;
         EXPECT_THAT(result.messages, StartsWith(row.message));
         EXPECT_THAT(result.out, IsEmpty());

@@ -1,17 +1,12 @@
 #include "tool/Tool.h"
 
-#include <algorithm>
 #include <cerrno>
 #include <csignal>
 #include <cstdlib>
 #include <fcntl.h>
-#include <fstream>
-#include <iterator>
 #include <stdexcept>
 #include <sys/wait.h>
 #include <unistd.h>
-
-namespace fs = std::filesystem;
 
 namespace {
 
@@ -68,43 +63,4 @@ ToolResult runTool(std::vector<std::string> const& arguments, std::string_view i
 ToolResult runShell(std::string const& line)
 {
     return run({"/bin/sh", "-c", line}, {});
-}
-
-ScratchFolder::ScratchFolder()
-{
-    std::string name = (fs::temp_directory_path() / "korvane-test-XXXXXX").string();
-    if (mkdtemp(name.data()) == nullptr)
-        throw std::runtime_error("no scratch folder");
-    folder_ = name;
-}
-
-ScratchFolder::~ScratchFolder()
-{
-    std::error_code ignored;
-    fs::remove_all(folder_, ignored);
-}
-
-std::string ScratchFolder::write(std::string const& name, std::string_view bytes) const
-{
-    std::ofstream file(folder_ / name, std::ios::binary);
-    file.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
-    file.close();
-    if (!file)
-        throw std::runtime_error("cannot write " + path(name));
-    return path(name);
-}
-
-std::string ScratchFolder::read(std::string const& name) const
-{
-    std::ifstream file(folder_ / name, std::ios::binary);
-    return {std::istreambuf_iterator<char>(file), {}};
-}
-
-std::vector<std::string> ScratchFolder::names() const
-{
-    std::vector<std::string> names;
-    for (fs::directory_entry const& entry : fs::directory_iterator(folder_))
-        names.push_back(entry.path().filename().string());
-    std::sort(names.begin(), names.end());
-    return names;
 }

@@ -1,6 +1,7 @@
 #pragma once
 
-#include <filesystem>
+#include <support/TemporaryFolder.h>
+
 #include <string>
 #include <string_view>
 #include <vector>
@@ -19,21 +20,4 @@ ToolResult runTool(std::vector<std::string> const& arguments, std::string_view i
 /// Runs a shell line in which "$KORVANE" is the built tool, for redirections and pipes.
 ToolResult runShell(std::string const& line);
 
-/// A folder of its own, gone with the object.
-class ScratchFolder {
-public:
-    ScratchFolder();
-    ScratchFolder(ScratchFolder const&) = delete;
-    ScratchFolder& operator=(ScratchFolder const&) = delete;
-    ~ScratchFolder();
-
-    std::string path(std::string const& name) const { return (folder_ / name).string(); }
-    /// Makes a file with these bytes and gives its path.
-    std::string write(std::string const& name, std::string_view bytes) const;
-    std::string read(std::string const& name) const;
-    /// The names of the files in it, sorted.
-    std::vector<std::string> names() const;
-
-private:
-    std::filesystem::path folder_;
-};
+using ScratchFolder = TemporaryFolder;
