@@ -33,19 +33,24 @@ namespace cc {
 namespace {
 
 constexpr int curveSize = 1024;
+// The format's own limits.
+constexpr long long longestCurve = 65536;
+constexpr long long longestEdge = 256;
 
 /// Where the rows of the table go that is read.
 struct rows_t {
     unsigned short* target = nullptr;
     std::size_t columns = 0;
     std::size_t expected = 0;
+    /// As many of them as there is room for.
+    std::size_t room = 0;
     std::size_t read = 0;
     rgb_t minimum{0.0f, 0.0f, 0.0f};
     rgb_t maximum{1.0f, 1.0f, 1.0f};
 
     bool add(std::string_view line)
     {
-        if (!target || read == expected)
+        if (!target || read == room)
             return false;
         char const* at = line.data();
         char const* const end = at + line.size();
@@ -61,16 +66,6 @@ struct rows_t {
     }
 };
 
-/// The rows of a table with so many points along each of its axes. 0 for a size out of its limits,
-/// and where the file (-1: of unknown size) is too short: a row takes two bytes at least.
-std::size_t possibleRows(long long size, long long limit, int axes, long long fileSize)
-{
-    if (size < 1 || size > limit)
-        return 0;
-    long long const rows = axes == 1 ? size : size * size * size;
-    return fileSize >= 0 && 2 * rows - 1 > fileSize ? 0 : static_cast<std::size_t>(rows);
-}
-
 /// A curve of any length as 1024 values, each that of the row at or before its place.
 void resample(vec_t<unsigned short> const& rows, vec_t<unsigned short>& table)
 {
@@ -83,7 +78,6 @@ void resample(vec_t<unsigned short> const& rows, vec_t<unsigned short>& table)
 
 int lut_t::readCUBE(tfreader_t& reader, unsigned long index)
 {
-    long long const fileSize = reader.fileSize();
     rows_t rows;
     vec_t<unsigned short> curve;
     bool skipping = false;
@@ -113,9 +107,10 @@ int lut_t::readCUBE(tfreader_t& reader, unsigned long index)
         } else if (tok(line, "LUT_1D_SIZE", value)) {
             if (counter++ != index)
                 continue;
-            rows.expected = possibleRows(leadingInteger(value), 65536, 1, fileSize);
-            if (rows.expected == 0)
+            long long const length = leadingInteger(value);
+            if (length < 1 || length > longestCurve)
                 return kBadData;
+            rows.expected = rows.room = static_cast<std::size_t>(length);
             kind = k1D;
             size = curveSize;
             table.clear();
@@ -128,10 +123,14 @@ int lut_t::readCUBE(tfreader_t& reader, unsigned long index)
             if (counter++ != index)
                 continue;
             long long const edge = leadingInteger(value);
-            rows.expected = possibleRows(edge, 256, 3, fileSize);
-            if (rows.expected == 0)
+            if (edge < 1 || edge > longestEdge)
                 return kBadData;
-            makeCube(static_cast<int>(edge), domainMin, domainMax);
+            kind = k3D;
+            size = static_cast<int>(edge);
+            rows.expected = static_cast<std::size_t>(edge * edge * edge);
+            rows.room = rowsThatFit(rows.expected, reader.fileSize());
+            table.clear();
+            table.resize(3 * rows.room);
             rows.target = table.data();
             rows.columns = 3;
         } else if (tok(line, "DOMAIN_MIN", value)) {

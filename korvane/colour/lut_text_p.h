@@ -2,6 +2,7 @@
 
 #include <korvane/colour/text_word_p.h>
 
+#include <algorithm>
 #include <array>
 #include <cstddef>
 #include <cstdint>
@@ -28,6 +29,13 @@ bool quoted(std::string_view line, std::string_view& text);
 bool findNumbers(std::string_view text, int count, float* numbers);
 /// The same for three words of letters, digits and underscores.
 bool findWords(std::string_view text, std::string_view (&words)[3]);
+
+/// How many of a table's rows a file of so many bytes, -1 for an unknown number, has room for: a
+/// row takes two bytes at least, the last one's end excepted.
+inline std::size_t rowsThatFit(std::size_t rows, long long fileSize) noexcept
+{
+    return fileSize < 0 ? rows : std::min(rows, (static_cast<std::size_t>(fileSize) + 1) / 2);
+}
 
 /// The decimal integer at the start of the text, as `strtol` reads it; 0 for none.
 long long leadingInteger(std::string_view text) noexcept;
