@@ -154,17 +154,15 @@ TEST(lut_cube, ACurveOfAnyLengthHas1024Values)
 
 TEST(lut_cube, IndexChoosesAmongTables)
 {
-    std::string const data = "0 0 1\n\n1\n\n# third\n2 2 2\n";
-    expectReadings("LUT_3D_SIZE 1\nLUT_1D_SIZE 1\nDOMAIN_MAX 2 2 2\nLUT_3D_SIZE 1\n\n",
-                   {
-                       {data, "0 6 1: 0 0 32767", 0},
-                       {data, "0 5 1024: 32767 32767 32767 32767 32767 32767 of 1024", 1},
-                       {data, "0 6 1: 65535 65535 65535", 2},
-                       {data, "0 0 0:", 3}, // beyond the last one: a success without a table
-                       {data, "0 0 0:", 4000000000ul},
-                       {"0 0 1\n\n\n1\n", "-1 5 1024: 0 0 0 0 0 0 of 1024",
-                        1}, // meant so: each empty line ends
-                   });
+    std::string const head = "LUT_3D_SIZE 1\nLUT_1D_SIZE 1\nDOMAIN_MAX 2 2 2\nLUT_3D_SIZE 1\n\n";
+    std::string const text = head + "0 0 1\n\n1\n\n# third\n2 2 2\n";
+    // An index beyond the last table is a success. Meant so: two empty lines are two ends.
+    expectReadings("", {{text, "0 6 1: 0 0 32767", 0},
+                        {text, "0 5 1024: 32767 32767 32767 32767 32767 32767 of 1024", 1},
+                        {text, "0 6 1: 65535 65535 65535", 2},
+                        {text, "0 0 0:", 3},
+                        {text, "0 0 0:", 4000000000ul},
+                        {head + "0 0 1\n\n\n1\n", "-1 5 1024: 0 0 0 0 0 0 of 1024", 1}});
 }
 
 TEST(lut_cube, IsWrittenSo)
@@ -191,26 +189,11 @@ TEST(lut_cube, IsWrittenSo)
 TEST(lut_cube, NumbersAreWrittenAsPrintfWritesThem)
 {
     // Among them ties, to the even digit below and above.
-    using Limits = std::numeric_limits<float>;
-    std::vector<float> numbers = {0.0f,
-                                  -0.0f,
-                                  1.0f,
-                                  0.9999995f,
-                                  0.9999996f,
-                                  0.0000005f,
-                                  0x1p-7f,
-                                  0x1.8p-6f,
-                                  0x1p-149f,
-                                  -0x1p-40f,
-                                  8388607.5f,
-                                  8388608.0f,
-                                  9.9999995f,
-                                  -16777216.0f,
-                                  9.9999999f,
-                                  10.0f,
-                                  Limits::max(),
-                                  Limits::lowest(),
-                                  Limits::infinity()};
+    std::vector<float> numbers;
+    for (std::string const& text :
+         split("0|-0|1|0.9999995|0.9999996|0.0000005|0x1p-7|0x1.8p-6|0x1p-149|-0x1p-40|8388607.5|"
+               "8388608|9.9999995|10|-16777216|0x1.fffffep127|-0x1.fffffep127|inf"))
+        numbers.push_back(std::strtof(text.c_str(), nullptr));
     std::mt19937 random(3);
     for (int i = 0; i < 2000; ++i)
         numbers.push_back(std::ldexp(static_cast<float>(static_cast<std::int32_t>(random())),
@@ -232,21 +215,6 @@ TEST(lut_cube, NumbersAreWrittenAsPrintfWritesThem)
     }
     ::close(fd);
     EXPECT_TRUE(folder.read("numbers") == expected);
-}
-
-TEST(lut_cube, WriteThenReadIsWithinOne)
-{
-    for (float const domainMin : {0.0f, -0.5f}) {
-        cc::lut_t lut = scatteredCube(17);
-        lut.domainMin = domainMin;
-        ReadLut const read = readLut(written(lut, cc::lut_t::kCUBE));
-        ASSERT_EQ(read.code, 0);
-        EXPECT_EQ(read.lut.domainMin, domainMin);
-        ASSERT_EQ(read.lut.table.size(), lut.table.size());
-        // Six decimals are cut on reading, so most come back one lower: meant so.
-        for (std::size_t i = 0; i < lut.table.size(); ++i)
-            ASSERT_LE(std::abs(read.lut.table[i] - lut.table[i]), 1) << i;
-    }
 }
 
 TEST(lut_cube, LoadingTakesTheTableAndLittleMore)
@@ -272,22 +240,19 @@ TEST(lut_cube, LoadingTakesTheTableAndLittleMore)
 TEST(lut_cube, ReadsWhatOtherToolsWrite)
 {
     struct Row {
-        char const* file;
-        int kind;
-        int size;
+        std::string name;
+        char const* kindAndSize;
         std::size_t place; ///< of a value in the table
         float value;
-    } const rows[] = {{"opencolorio-3d.cube", 6, 5, 3, 0.271916f},
-                      {"opencolorio-1d.cube", 5, 1024, 600, 0.707107f},
-                      {"argyll-3d.cube", 6, 5, 16, 0.258145f}};
+    } const rows[] = {{"opencolorio-3d", "0 6 5:", 3, 0.271916f},
+                      {"opencolorio-1d", "0 5 1024:", 600, 0.707107f},
+                      {"argyll-3d", "0 6 5:", 16, 0.258145f}};
     for (auto const& row : rows) {
-        cc::lut_t lut;
-        EXPECT_EQ(lut.read((std::string(KORVANE_TEST_DATA "/lut/") + row.file).c_str(), 0), 0);
-        EXPECT_EQ(lut.kind, row.kind) << row.file;
-        EXPECT_EQ(lut.size, row.size) << row.file;
-        ASSERT_GT(lut.table.size(), row.place) << row.file;
-        EXPECT_EQ(lut.table[row.place], static_cast<int>(row.value * 65535)) << row.file;
-        EXPECT_EQ(lut.title + ".cube", row.file);
+        ReadLut read;
+        read.lut.read((KORVANE_TEST_DATA "/lut/" + row.name + ".cube").c_str(), 0);
+        ASSERT_TRUE(outcomeOf(read).starts_with(row.kindAndSize)) << row.name;
+        EXPECT_EQ(read.lut.table[row.place], static_cast<int>(row.value * 65535)) << row.name;
+        EXPECT_EQ(read.lut.title, row.name);
     }
 }
 

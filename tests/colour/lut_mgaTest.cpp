@@ -91,16 +91,4 @@ TEST(lut_mga, IsWrittenSo)
               "3\t4\t5\t6\n15\t16\t17\t18\n9\t10\t11\t12\n21\t22\t65535\t0\n");
 }
 
-TEST(lut_mga, WriteThenReadIsTheSame)
-{
-    cc::lut_t lut = scatteredCube(33);
-    lut.title = "Scattered";
-    ReadLut const read = readLut(written(lut, cc::lut_t::kMGA));
-    EXPECT_EQ(read.code, 0);
-    EXPECT_EQ(read.lut.size, 33);
-    EXPECT_EQ(read.lut.title, "Scattered");
-    EXPECT_TRUE(std::equal(lut.table.begin(), lut.table.end(), read.lut.table.begin(),
-                           read.lut.table.end()));
-}
-
 } // namespace

@@ -208,21 +208,36 @@ TEST(lut_t, ProcessRoundsAndClampsAndTakesWholeCubesOnly)
     EXPECT_THROW(lut.process(refuses), std::runtime_error);
 }
 
-TEST(lut_t, EveryTruncationIsReadOrRefused)
+TEST(lut_t, WhatIsWrittenIsReadAndItsTruncationsAreRefused)
 {
-    cc::lut_t lut = scatteredCube(2);
-    lut.title = "Sample";
-    testing::internal::CaptureStderr(); // titles that are cut short are told
-    for (unsigned int const format : {cc::lut_t::kCUBE, cc::lut_t::kMGA}) {
-        std::string const whole = written(lut, format);
-        for (std::size_t length = 0; length < whole.size(); ++length) {
-            ReadLut const read = readLut(whole.substr(0, length));
+    struct Row {
+        unsigned int format;
+        float domainMin;
+        int tolerance;
+    } const rows[] = {{cc::lut_t::kMGA, 0.0f, 0},
+                      {cc::lut_t::kCUBE, 0.0f, 1}, // meant so: six decimals are cut on reading
+                      {cc::lut_t::kCUBE, -0.5f, 1}};
+    for (auto const& row : rows) {
+        cc::lut_t lut = scatteredCube(17);
+        lut.domainMin = row.domainMin;
+        lut.title = "Scattered";
+        ReadLut const read = readLut(written(lut, row.format));
+        ASSERT_TRUE(outcomeOf(read).starts_with("0 6 17:")) << row.format;
+        EXPECT_EQ(read.lut.domainMin, row.domainMin);
+        EXPECT_EQ(read.lut.title, "Scattered");
+        for (std::size_t i = 0; i < lut.table.size(); ++i)
+            ASSERT_LE(std::abs(read.lut.table[i] - lut.table[i]), row.tolerance) << i;
+
+        testing::internal::CaptureStderr(); // titles that are cut short are told
+        std::string const whole = written(scatteredCube(2), row.format);
+        for (std::size_t length = 0; length < whole.size(); length += 1 + length % 3) {
+            ReadLut const part = readLut(whole.substr(0, length));
             // Meant so: a part of the last row is a row.
             bool const nearlyWhole = length > whole.rfind('\n', whole.size() - 2) + 1;
-            EXPECT_TRUE(read.code != 0 || nearlyWhole || read.lut.table.empty()) << length;
+            EXPECT_TRUE(part.code != 0 || nearlyWhole || part.lut.table.empty()) << length;
         }
+        testing::internal::GetCapturedStderr();
     }
-    testing::internal::GetCapturedStderr();
 }
 
 } // namespace
