@@ -1,5 +1,7 @@
 #pragma once
 
+#include <korvane/colour/lut_t.h>
+
 #include <cstddef>
 #include <cstdint>
 #include <cstdlib>
@@ -32,4 +34,16 @@ inline void require(bool condition)
 {
     if (!condition)
         std::abort();
+}
+
+/// Writes and fills a table that may hold fewer rows than its size tells.
+inline void useTable(cc::lut_t& lut)
+{
+    class Identity final : public cc::lut_t::processor_t {
+        cc::rgb_t process(cc::rgb_t const& colour) const override { return colour; }
+    };
+    MemoryFile const file;
+    lut.writeCUBE(file.fd(), "f");
+    lut.writeMGA(file.fd(), "f");
+    lut.process(Identity());
 }

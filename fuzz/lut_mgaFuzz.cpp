@@ -13,5 +13,6 @@ extern "C" int LLVMFuzzerTestOneInput(std::uint8_t const* data, std::size_t size
     int const code = lut.readMGA(reader, 0);
     require(code == cc::kSuccess || code == cc::kBadData);
     require(lut.table.size() <= 2 * size + 3);
+    useTable(lut);
     return 0;
 }

@@ -45,6 +45,7 @@ namespace {
 constexpr std::size_t orders[6][3] = {{0, 1, 2}, {0, 2, 1}, {2, 0, 1},
                                       {2, 1, 0}, {1, 0, 2}, {1, 2, 0}};
 constexpr int orderOfEntries = 3;
+constexpr long long mostEntries = 16777216; // a cube of 256
 
 /// The order that the words of a "values" line stand for; `order` if the first is no colour.
 int orderOf(std::string_view const (&words)[3], int order)
@@ -74,7 +75,6 @@ int cubeRoot(long long count)
 int lut_t::readMGA(tfreader_t& reader, unsigned long)
 {
     kind = k3D;
-    long long const fileSize = reader.fileSize();
     bool inHeader = false;
     int order = 0;
     long long count = 0;
@@ -92,12 +92,11 @@ int lut_t::readMGA(tfreader_t& reader, unsigned long)
                 title = value;
         } else if (tok(line, "in", value)) {
             count = leadingInteger(value);
-            // A row takes two bytes at least.
-            if (count < 0 || count > 16777216 || (fileSize >= 0 && 2 * count - 1 > fileSize))
+            if (count < 0 || count > mostEntries)
                 return kBadData;
             size = cubeRoot(count);
             table.clear();
-            table.resize(static_cast<std::size_t>(3 * count));
+            table.resize(3 * rowsThatFit(static_cast<std::size_t>(count), reader.fileSize()));
         } else if (tok(line, "values", value)) {
             if (findWords(value, words))
                 order = orderOf(words, order);

@@ -63,7 +63,8 @@ public:
     void makeCube(int edge, float minimum = 0.0f, float maximum = 1.0f);
 
     /// Reads table number `index`, 0 for the first one, whatever was here before: kSuccess,
-    /// kCannotOpen, kUnknownFormat or kBadData, which leaves what was read so far. An index beyond
+    /// kCannotOpen, kUnknownFormat or kBadData, which leaves what was read so far: kind and size as
+    /// the file tells them, and maybe fewer rows than that. An index beyond
     /// the last table is a success with an empty table of kind 0. A file without a title has its
     /// name as title.
     ///

@@ -1,6 +1,7 @@
 #include <korvane/colour/lut_text_p.h>
 
 #include <algorithm>
+#include <array>
 #include <bit>
 #include <cerrno>
 #include <charconv>
@@ -25,11 +26,6 @@ constexpr bool isDigit(char c) noexcept
 constexpr bool isSpace(char c) noexcept
 {
     return c == ' ' || (c >= '\t' && c <= '\r');
-}
-
-constexpr bool isBlank(char c) noexcept
-{
-    return c == ' ' || c == '\t';
 }
 
 constexpr char toLower(char c) noexcept
@@ -160,6 +156,14 @@ bool divideExactly(std::uint64_t digits, int places, float& result)
     return true;
 }
 
+/// "00" to "99".
+constexpr auto digitPairs = [] {
+    std::array<char, 200> pairs{};
+    for (std::size_t i = 0; i < pairs.size(); ++i)
+        pairs[i] = static_cast<char>('0' + (i % 2 ? i / 2 % 10 : i / 20));
+    return pairs;
+}();
+
 } // namespace
 
 // --- Header lines ---
@@ -228,7 +232,7 @@ long long leadingInteger(std::string_view text) noexcept
 
 // --- Data rows ---
 
-float qdcstr2float(char const*& at, char const* end) noexcept
+float qdcstr2anyFloat(char const*& at, char const* end) noexcept
 {
     while (at != end && isBlank(*at))
         ++at;
@@ -286,13 +290,6 @@ lut_output_t& lut_output_t::operator<<(std::string_view text)
     return *this;
 }
 
-lut_output_t& lut_output_t::operator<<(char character)
-{
-    *room(1) = character;
-    ++used_;
-    return *this;
-}
-
 lut_output_t& lut_output_t::operator<<(std::uint64_t number)
 {
     char* const text = room(kLongestNumber);
@@ -301,14 +298,12 @@ lut_output_t& lut_output_t::operator<<(std::uint64_t number)
     return *this;
 }
 
-lut_output_t& lut_output_t::operator<<(float number)
+inline char* lut_output_t::printFixed(char* at, float number)
 {
     // A float below 2^23 is a 24-bit integer over a power of two, so its millionths are the
     // quotient of a 44-bit integer, rounded on its exact remainder.
     auto const bits = std::bit_cast<std::uint32_t>(number);
     int const exponent = static_cast<int>(bits >> 23 & 0xFF);
-    char* const text = room(kLongestNumber);
-    char* at = text;
     if (int const shift = 150 - std::max(exponent, 1); shift > 0) {
         std::uint64_t const integer = (bits & 0x7FFFFF) | (exponent ? 0x800000u : 0u);
         std::uint64_t millionths = 0;
@@ -321,17 +316,32 @@ lut_output_t& lut_output_t::operator<<(float number)
         }
         if (bits >> 31)
             *at++ = '-';
-        at = std::to_chars(at, at + 8, millionths / 1000000).ptr;
-        auto fraction = static_cast<std::uint32_t>(millionths % 1000000);
-        *at = '.';
-        for (int i = 6; i > 0; --i, fraction /= 10)
-            at[i] = static_cast<char>('0' + fraction % 10);
-        at += 7;
-    } else {
-        auto const value = static_cast<double>(number);
-        at = std::to_chars(at, at + kLongestNumber, value, std::chars_format::fixed, 6).ptr;
+        auto const whole = static_cast<std::uint32_t>(millionths / 1000000);
+        auto const fraction = static_cast<std::uint32_t>(millionths % 1000000);
+        if (whole < 10)
+            *at++ = static_cast<char>('0' + whole);
+        else
+            at = std::to_chars(at, at + 7, whole).ptr;
+        *at++ = '.';
+        for (std::uint32_t const pair : {fraction / 10000, fraction / 100 % 100, fraction % 100}) {
+            std::memcpy(at, &digitPairs[2 * pair], 2);
+            at += 2;
+        }
+        return at;
     }
-    used_ += static_cast<std::size_t>(at - text);
+    auto const value = static_cast<double>(number);
+    return std::to_chars(at, at + kLongestNumber, value, std::chars_format::fixed, 6).ptr;
+}
+
+lut_output_t& lut_output_t::row(std::array<float, 3> const& numbers)
+{
+    char* at = room(numbers.size() * (kLongestNumber + 1));
+    for (float const number : numbers) {
+        at = printFixed(at, number);
+        *at++ = ' ';
+    }
+    at[-1] = '\n';
+    used_ = static_cast<std::size_t>(at - block_.get());
     return *this;
 }
 
@@ -339,13 +349,6 @@ int lut_output_t::finish()
 {
     flush();
     return error_;
-}
-
-char* lut_output_t::room(std::size_t size)
-{
-    if (kBlock - used_ < size)
-        flush();
-    return block_.get() + used_;
 }
 
 void lut_output_t::flush()

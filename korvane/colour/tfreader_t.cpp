@@ -1,5 +1,6 @@
 #include <korvane/colour/tfreader_t.h>
 
+#include <korvane/colour/text_word_p.h>
 #include <korvane/platform/CFString.h>
 
 #include <algorithm>
@@ -22,6 +23,13 @@ constexpr char16_t partner(char16_t ending) noexcept
 
 std::size_t findLineEnd(char const* bytes, std::size_t from, std::size_t end) noexcept
 {
+    for (; end - from >= kWordSize; from += kWordSize) {
+        std::uint64_t const word = wordAt(bytes + from);
+        std::size_t const before =
+            bytesBefore(zeroBytes(word ^ repeated('\n')) | zeroBytes(word ^ repeated('\r')));
+        if (before < kWordSize)
+            return from + before;
+    }
     while (from < end && bytes[from] != '\n' && bytes[from] != '\r')
         ++from;
     return from;
@@ -116,7 +124,8 @@ bool tfreader_t::readBytes(std::string_view& line)
         position_ += buffer_[position_] == static_cast<char>(pairEnd_);
         pairEnd_ = 0;
     }
-    text_.clear();
+    if (!text_.empty())
+        text_.clear();
     for (;;) {
         std::size_t const end = findLineEnd(buffer_, position_, valid_);
         std::string_view const piece(buffer_ + position_, end - position_);

@@ -2,22 +2,18 @@
 
 #include "colour/LutSupport.h"
 
-#include <gtest/gtest.h>
-
 namespace {
 
 TEST(multilut_t, ReadsTheTablesOfAFileInTurn)
 {
-    char const* const twoTables = "LUT_1D_SIZE 2\nLUT_3D_SIZE 1\n\n0\n1\n\n.5 .5 .5\n";
-    char const* const oneMGA = "#type: 3D cube file\nin 1\nvalues red green blue\n0 1 2 3\n";
     struct Row {
         char const* text;
         int code;
         std::vector<int> kinds;
     } const rows[] = {
-        {twoTables, 0, {5, 6}},
-        {oneMGA, 0, {6}}, // its reader takes no index: not the same table for ever
-        {"LUT_3D_SIZE 1\n0 0 0\n", 0, {6}},
+        {"LUT_1D_SIZE 2\nLUT_3D_SIZE 1\n\n0\n1\n\n.5 .5 .5\n", 0, {5, 6}},
+        // Its reader takes no index: not the same table for ever.
+        {"#type: 3D cube file\nin 1\nvalues red green blue\n0 1 2 3\n", 0, {6}},
         {"TITLE \"none\"\n", 0, {}},
         {"nothing", cc::kUnknownFormat, {}},
         {"LUT_1D_SIZE 2\nLUT_1D_SIZE 2\n0\n1\n\n0\n", cc::kBadData, {5}}, // the second is short
@@ -37,20 +33,16 @@ TEST(multilut_t, AppendsOnDemandAndStopsAtItsLimit)
 {
     TemporaryFolder const folder;
     std::string text;
-    for (int i = 0; i < 300; ++i)
-        text += "LUT_3D_SIZE 1\n";
-    for (int i = 0; i < 300; ++i)
-        text += "0 0 1\n\n";
-    std::string const path = folder.write("many.cube", text);
+    for (int i = 0; i < 600; ++i)
+        text += i < 300 ? "LUT_3D_SIZE 1\n" : "0 0 1\n\n";
+    std::string const many = folder.write("many.cube", text);
+    std::string const one = folder.write("one.cube", "LUT_3D_SIZE 1\n0 0 0\n");
     cc::multilut_t luts;
-    EXPECT_EQ(luts.read(path.c_str(), true), cc::kSuccess);
-    EXPECT_EQ(luts.tables.size(), cc::multilut_t::kMostTables);
-    EXPECT_EQ(luts.tables.back().table[2], 65535);
-    std::string const other = folder.write("one.cube", "LUT_3D_SIZE 1\n0 0 0\n");
-    EXPECT_EQ(luts.read(other.c_str(), true), cc::kSuccess);
-    EXPECT_EQ(luts.tables.size(), cc::multilut_t::kMostTables + 1);
-    EXPECT_EQ(luts.read(other.c_str(), false), cc::kSuccess);
-    EXPECT_EQ(luts.tables.size(), 1u);
+    std::size_t expected = cc::multilut_t::kMostTables;
+    for (auto const& [path, append] : {std::pair(many, true), {one, true}, {one, false}}) {
+        EXPECT_EQ(luts.read(path.c_str(), append), cc::kSuccess);
+        EXPECT_EQ(luts.tables.size(), append ? expected++ : 1u);
+    }
 }
 
 } // namespace

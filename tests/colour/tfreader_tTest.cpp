@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <bit>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -26,42 +27,47 @@ Lines linesOf(std::string_view bytes, int encoding = cc::tfreader_t::kUTF8)
     return lines;
 }
 
+/// A text as UTF-16 of an order, behind a mark.
+std::string unitsOf(std::string_view text, bool bigEndian)
+{
+    std::string units = bigEndian ? "\xFE\xFF" : "\xFF\xFE";
+    for (char const c : text)
+        units += bigEndian ? std::string{'\0', c} : std::string{c, '\0'};
+    return units;
+}
+
 TEST(tfreader_t, EveryEndingEndsALineAndPairsAreOne)
 {
     struct Row {
         std::string bytes;
         Lines lines;
     } const rows[] = {
-        {"", {}},
-        {"\n", {""}},
-        {"a", {"a"}},
-        {"a\nb", {"a", "b"}},
-        {"a\rb\r", {"a", "b"}},
-        {"a\r\nb\r\n", {"a", "b"}},
-        {"a\n\rb\n\r", {"a", "b"}},
-        {"a\n\nb", {"a", "", "b"}},
-        {"a\r\rb", {"a", "", "b"}},
-        {"a\r\n\r\nb", {"a", "", "b"}},
-        {"a\n\r\nb", {"a", "", "b"}},
-        {"a\r\n\n\rb", {"a", "", "b"}},
-        {"a\0b\n"s, {"a\0b"s}},
-        {"\xEF\xBB\xBF"
-         "a\n",
-         {"a"}},
-        {"a\n\xEF\xBB\xBF", {"a", "\xEF\xBB\xBF"}},
-    };
-    for (auto const& row : rows)
+        {"a\nb\n", {"a", "b"}},         {"a\rb\r", {"a", "b"}},       {"\n", {""}},
+        {"a\r\nb\r\n", {"a", "b"}},     {"a\n\rb\n\r", {"a", "b"}},   {"", {}},
+        {"a\n\nb", {"a", "", "b"}},     {"a\r\rb", {"a", "", "b"}},   {"a", {"a"}},
+        {"a\r\n\r\nb", {"a", "", "b"}}, {"a\n\r\nb", {"a", "", "b"}}, {"\r\r\n\r", {"", "", ""}},
+        {"a\r\n\n\rb", {"a", "", "b"}}, {"a\0b\n"s, {"a\0b"s}}};
+    for (auto const& row : rows) {
         EXPECT_EQ(linesOf(row.bytes), row.lines) << row.bytes;
+        EXPECT_EQ(linesOf("\xEF\xBB\xBF" + row.bytes), row.lines) << row.bytes;
+        for (bool const bigEndian : {false, true})
+            EXPECT_EQ(linesOf(unitsOf(row.bytes, bigEndian), cc::tfreader_t::kUTF16), row.lines);
+    }
+    EXPECT_EQ(linesOf("a\n\xEF\xBB\xBF"), (Lines{"a", "\xEF\xBB\xBF"})); // no mark there
 }
 
 TEST(tfreader_t, LinesGoAcrossTheBuffersEnd)
 {
-    // An ending that is cut by the end of the 4096 bytes, or lies just beside it.
-    for (std::size_t const length : {4094u, 4095u, 4096u, 4097u, 8190u, 8191u, 8192u, 20000u}) {
+    // An ending at every place of a word, cut by the end of the 4096 bytes, or just beside it.
+    for (std::size_t const length : {1u, 2u, 3u, 4u, 5u, 6u, 7u, 8u, 2046u, 2047u, 4094u, 4095u,
+                                     4096u, 4097u, 8191u, 20000u}) {
         std::string const text(length, 'x');
-        for (char const* const ending : {"\r\n", "\n\r", "\n", "\r"})
-            EXPECT_EQ(linesOf(text + ending + "b" + ending), (Lines{text, "b"})) << length;
-        EXPECT_EQ(linesOf("a\n" + text), (Lines{"a", text})) << length;
+        for (char const* const ending : {"\r\n", "\n\r", "\n", "\r"}) {
+            std::string const bytes = text + ending + "b\v\f\x8A\x8D" + ending;
+            EXPECT_EQ(linesOf(bytes), (Lines{text, "b\v\f\x8A\x8D"})) << length;
+            EXPECT_EQ(linesOf(unitsOf(text + ending + text, true), cc::tfreader_t::kUTF16),
+                      (Lines{text, text}));
+        }
     }
 }
 
@@ -72,50 +78,31 @@ TEST(tfreader_t, OtherEncodingsComeOutAsUTF8)
         std::string bytes;
         Lines lines;
     } const rows[] = {
-        {cc::tfreader_t::kMacRoman, "caf\x8E\r\xF0\r", {"café", "\xEF\xA3\xBF"}},
-        {cc::tfreader_t::kUTF16,
-         "\xFF\xFE"
-         "a\0\r\0\n\0b\0"s,
-         {"a", "b"}},
-        {cc::tfreader_t::kUTF16, "\xFE\xFF\0a\0\n\0\r\0b"s, {"a", "b"}},
-        {cc::tfreader_t::kUTF16, "\xFE\xFF\0\xE9\0\n\0\n"s, {"é", ""}},
-        {cc::tfreader_t::kUTF16, "\xFE\xFF\0a\x0D\x0A\0b"s, {"a", "b"}}, // two single bytes
-        {cc::tfreader_t::kUTF16, "\xFE\xFF\xD8\x3D\xDE\x00\xD8\x3D"s, {"\U0001F600\uFFFD"}},
-        {cc::tfreader_t::kUTF16,
-         "\xFF\xFE"
-         "a\0b"s,
-         {"a"}}, // half a unit at the end
-        {cc::tfreader_t::kUTF16, "\xFF\xFE"s, {}},
+        {0, "caf\x8E\r\xF0\r", {"café", "\xEF\xA3\xBF"}},
+        {2, "\xFE\xFF\0\xE9\0\n\0\n"s, {"é", ""}},
+        {2, "\xFE\xFF\0a\x0D\x0A\0b"s, {"a", "b"}}, // two single bytes
+        {2, "\xFE\xFF\xD8\x3D\xDE\x00\xD8\x3D"s, {"\U0001F600\uFFFD"}},
+        {2, unitsOf("a", false) + "b", {"a"}}, // half a unit at the end
     };
     for (auto const& row : rows)
         EXPECT_EQ(linesOf(row.bytes, row.encoding), row.lines);
-
-    std::string const text(3000, 'y');
-    std::string units = "\xFE\xFF";
-    for (char const c : text + "\r\n" + text)
-        units += {'\0', c};
-    EXPECT_EQ(linesOf(units, cc::tfreader_t::kUTF16), (Lines{text, text}));
 }
 
 TEST(tfreader_t, UTF16WithoutAMarkIsInTheOrderThatIsSet)
 {
     TemporaryFolder const folder;
-    char16_t const units[] = u"a\nb";
-    std::string bytes(reinterpret_cast<char const*>(units), 6);
-    cc::tfreader_t reader(cc::tfreader_t::kUTF16);
-    std::string line;
-    ASSERT_EQ(reader.open(folder.write("native", bytes).c_str()), cc::kSuccess);
-    EXPECT_TRUE(reader.readln(line));
-    EXPECT_EQ(line, "a");
-    reader.close();
-    for (std::size_t i = 0; i < bytes.size(); i += 2)
-        std::swap(bytes[i], bytes[i + 1]);
-    ASSERT_EQ(reader.open(folder.write("swapped", bytes).c_str()), cc::kSuccess);
-    reader.setSwapBytes(true);
-    EXPECT_TRUE(reader.readln(line));
-    EXPECT_TRUE(reader.rewind()); // keeps the order
-    EXPECT_TRUE(reader.readln(line));
-    EXPECT_EQ(line, "a");
+    std::string const path = folder.write("text", unitsOf("a\nb", true).substr(2));
+    for (bool const swap : {true, false}) {
+        cc::tfreader_t reader(cc::tfreader_t::kUTF16);
+        ASSERT_EQ(reader.open(path.c_str()), cc::kSuccess);
+        reader.setSwapBytes(swap);
+        std::string line;
+        EXPECT_TRUE(reader.readln(line));
+        EXPECT_TRUE(reader.rewind()); // keeps the order
+        EXPECT_TRUE(reader.readln(line));
+        bool const isNative = swap == (std::endian::native == std::endian::little);
+        EXPECT_EQ(line == "a", isNative);
+    }
 }
 
 TEST(tfreader_t, AnswersWithCodes)

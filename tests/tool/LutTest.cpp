@@ -147,6 +147,7 @@ TEST(ToolLut, AppliesColoursOfArgumentsAndOfInput)
         {{"0.5", "0.5", "0"}, "0.5 0 0\n"},
         {{"--method", "trilinear", "0.5", "0.5", "0"}, "0.25 0 0\n"},
         {{"-0.5", "+7", "1e-1", "1", "1", "0"}, "0 0 0.1\n1 0 0\n"},
+        {{"+.5", ".5", "-.2", "1", "1", "-1e-3"}, "0.5 0 0\n1 0 0\n"},
     };
     for (Row const& row : rows) {
         std::vector<std::string> arguments = {"lut", "apply", path};
@@ -159,7 +160,8 @@ TEST(ToolLut, AppliesColoursOfArgumentsAndOfInput)
               "korvane: standard input:2: a colour is three numbers, here are 2\n");
     EXPECT_EQ(runTool({"lut", "apply", path}, "0 0 nan\n").exitCode, 3);
     EXPECT_EQ(runTool({"lut", "apply", path, "0", "0"}).exitCode, 2);
-    EXPECT_EQ(runTool({"lut", "apply", path, "0", "0", "x"}).exitCode, 2);
+    for (char const* const word : {"x", "-.x", "-.", "+-1", "-x"})
+        EXPECT_EQ(runTool({"lut", "apply", path, "0", "0", word}).exitCode, 2) << word;
 }
 
 TEST(ToolLut, PlotsAsSVG)

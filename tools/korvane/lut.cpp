@@ -113,7 +113,7 @@ private:
 /// False for what is not one finite number and nothing else.
 bool parse(std::string_view word, float& value)
 {
-    word.remove_prefix(word.starts_with('+') ? 1 : 0);
+    word.remove_prefix(word.starts_with('+') && !word.starts_with("+-") ? 1 : 0);
     auto const [end, error] = std::from_chars(word.data(), word.data() + word.size(), value);
     return error == std::errc() && end == word.data() + word.size() && std::isfinite(value);
 }

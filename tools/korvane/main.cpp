@@ -2,9 +2,12 @@
 #include "AtomicOutput.h"
 #include "ToolError.h"
 
+#include <algorithm>
 #include <exception>
 #include <iostream>
 #include <sstream>
+#include <string>
+#include <vector>
 
 namespace {
 
@@ -23,12 +26,24 @@ ExitCode answerParseError(CLI::App const& app, CLI::ParseError const& error)
     return ExitCode::Usage;
 }
 
+/// The words of the command line, last one first as the parser wants them. It would take "-.5"
+/// for an option, and "-0.5" for a number.
+std::vector<std::string> wordsOf(int count, char** arguments)
+{
+    std::vector<std::string> words(arguments + std::min(count, 1), arguments + count);
+    for (std::string& word : words)
+        if (word.size() > 2 && word.starts_with("-.") && word[2] >= '0' && word[2] <= '9')
+            word.insert(1, "0");
+    std::reverse(words.begin(), words.end());
+    return words;
+}
+
 ExitCode run(int count, char** arguments)
 {
     auto const app = makeApp();
     try {
         try {
-            app->parse(count, arguments);
+            app->parse(wordsOf(count, arguments));
             return ExitCode::Done;
         } catch (CLI::ParseError const& error) {
             return answerParseError(*app, error);
