@@ -727,8 +727,10 @@ void addMediaCommands(CLI::App& program)
     CLI::App& treeCommand =
         *media.add_subcommand("tree", "Print the atoms of a movie with their offsets and sizes");
     treeCommand.add_option("FILE", treeOptions->file, "A QuickTime or MP4 file")->required();
-    treeCommand.add_option("--against", treeOptions->against,
-                           "Mark what is not as in this file: * changed, + new, - gone, > moved");
+    treeCommand
+        .add_option("--against", treeOptions->against,
+                    "Mark what is not as in this file: * changed, + new, - gone, > moved")
+        ->type_name("FILE");
     addJsonFlag(treeCommand, treeOptions->json);
     treeCommand.callback([treeOptions] { tree(*treeOptions); });
 
@@ -762,8 +764,10 @@ void addMediaCommands(CLI::App& program)
     setCommand.add_option("--source", setOptions->source, "What made the metadata");
     setCommand.add_flag("--first-generation", setOptions->firstGeneration,
                         "Also write spherical metadata of the first generation, for old players");
-    setCommand.add_option("--hdr", setOptions->hdr,
-                          "A JSON file of mastering display and content light numbers");
+    setCommand
+        .add_option("--hdr", setOptions->hdr,
+                    "A JSON file of mastering display and content light numbers")
+        ->type_name("FILE");
     setCommand.add_option("--colour,--color", setOptions->colour,
                           "P,T,M: primaries, transfer, matrix (ITU-T H.273)");
     setCommand.add_option("--pixel-aspect", setOptions->pixelAspect, "H:V");
@@ -778,4 +782,9 @@ void addMediaCommands(CLI::App& program)
                           "Spherical metadata of both generations, in every video track");
     stripCommand.add_flag("--hdr", stripOptions->hdr, "Mastering display and content light");
     stripCommand.callback([stripOptions] { strip(*stripOptions); });
+
+    addExamples(media, "  korvane media tree movie.mp4\n"
+                       "  korvane media set movie.mp4 sphere.mp4 --spherical equirectangular --hdr "
+                       "mastering.json\n"
+                       "  korvane media strip sphere.mp4 plain.mp4 --spherical");
 }
