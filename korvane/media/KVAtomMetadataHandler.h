@@ -40,12 +40,12 @@
 /// docs/media.md tells the bytes.
 ///
 /// What is read is not always what can be written back:
-///  - `field_detail` reads as the value of `field_fields`, and `pixel_aspect_v` as that of
-///  `pixel_aspect_h`.
-///  - `colr` is written in a layout that is not the one which is read; see `setImageDescColorInfo`.
-///  - First-generation metadata always says "equirectangular", and elements that it adds by default
-///  stand inside
-///    an element of their own name.
+///
+/// - `field_detail` reads as `field_fields`, and `pixel_aspect_v` as `pixel_aspect_h`.
+/// - `colr` is written in a layout that is not the one which is read; see `setImageDescColorInfo`.
+/// - First-generation metadata always says "equirectangular".
+/// - Elements that it adds by default stand inside an element of their own name.
+///
 /// So give `setMetadata` what is to change, not all that was read.
 ///
 /// Statuses are those of KVAtomBoxFile.
