@@ -86,3 +86,18 @@ TEST(Pages, LeadToFilesThatAreThere)
             EXPECT_NE(index.find("(" + name), index.npos) << name;
         }
 }
+
+TEST(Pages, TheMapHasTheFloorsThatAreThere)
+{
+    std::multiset<std::string> floors, told;
+    std::ifstream list(KORVANE_FLOORS);
+    for (std::string line; std::getline(list, line);)
+        if (line.rfind("floor ", 0) == 0)
+            floors.insert(line.substr(6, line.find(' ', 6) - 6));
+    std::string const map = contents(root / "docs/map.md");
+    std::string const table = between(map, "| Floor | Stands on | For |\n|---|---|---|\n", "\n\n");
+    for (std::size_t at = 0; (at = table.find("| `", at)) != table.npos; at += 3)
+        if (at == 0 || table[at - 1] == '\n')
+            told.insert(table.substr(at + 3, table.find('`', at + 3) - at - 3));
+    EXPECT_EQ(told, floors);
+}
