@@ -12,6 +12,9 @@ set(CPACK_DEB_COMPONENT_INSTALL ON)
 set(CPACK_DEBIAN_FILE_NAME DEB-DEFAULT)
 set(CPACK_DEBIAN_PACKAGE_CONTROL_STRICT_PERMISSION ON)
 
+# Debian has its own way with manual pages and completions.
+set(CPACK_PRE_BUILD_SCRIPTS "${PROJECT_SOURCE_DIR}/cmake/KorvaneDebianShare.cmake")
+
 set(library "libkorvane${KORVANE_ABI}")
 set(CPACK_DEBIAN_RUNTIME_PACKAGE_NAME ${library})
 set(CPACK_DEBIAN_RUNTIME_PACKAGE_SECTION libs)

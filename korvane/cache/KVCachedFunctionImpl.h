@@ -29,8 +29,9 @@ struct KVCachedArgument<T*> {
 /// Remembers the results of a function that is dear to compute and depends on its arguments alone.
 /// Any number of threads may call it.
 ///
-///     KVCachedFunctionImpl<Hash, std::string> hash([](std::string path) { return md5(path); },
-///     100); hash("a.icc");      // computed hash("a.icc");      // remembered
+///     KVCachedFunctionImpl<Hash, std::string> hash(&hashOfFile, 100);
+///     hash("a.icc");      // computed
+///     hash("a.icc");      // remembered
 ///
 /// At most `capacity` results are kept, the most recently used ones. The function runs inside the
 /// memoiser's lock: no result is computed twice while it is kept, and callers with other arguments

@@ -37,9 +37,9 @@ public:
                                                     CMTime frameDuration, CMTime startTimeOffset,
                                                     bool includeFormattingTags);
 
-    /// The text with <b>, <i>, <u> and <font color="#rrggbb"> around what is bold, italic,
-    /// underlined and coloured. A tag ends where its attribute does, so tags can overlap; none
-    /// stands within a grapheme cluster, whose first unit decides.
+    /// The text with `<b>`, `<i>`, `<u>` and `<font color="#rrggbb">` around what is bold,
+    /// italic, underlined and coloured. A tag ends where its attribute does, so tags can overlap;
+    /// none stands within a grapheme cluster, whose first unit decides.
     static KVString _taggedTextFromCaptionString(NSAttributedString const* string);
 };
 

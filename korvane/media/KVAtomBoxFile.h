@@ -37,14 +37,13 @@ class KVAtomOutputStream;
 /// `getWritePercentDone` and `cancelWrite`.
 ///
 /// What the writer leaves to its caller:
-///  - `stco` entries are 32 bits wide and wrap: a file whose offsets pass 4 GiB is damaged without
-///  a word.
-///  - Only the tables that are in the tree are moved, all of them by one amount
-///  (`getMediaDataShift`), and offsets of other
-///    kinds (`moof`, `mfra`, `saio`) are not.
-///  - Bytes behind the last atom that could be read, of the file or of a container whose children
-///  were read, are not written.
-///  - A failed or cancelled write leaves a partial output file.
+///
+/// - `stco` entries are 32 bits wide and wrap: offsets beyond 4 GiB are damaged without a word.
+/// - Only the tables that are in the tree are moved, all of them by `getMediaDataShift`.
+/// - Offsets of other kinds (`moof`, `mfra`, `saio`) are not moved.
+/// - Bytes behind the last atom that could be read, of the file or of a container whose children
+///   were read, are not written.
+/// - A failed or cancelled write leaves a partial output file.
 class KV_EXPORT KVAtomBoxFile : public KVAtomBox {
 public:
     KVAtomBoxFile();

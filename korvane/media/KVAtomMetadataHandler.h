@@ -22,17 +22,16 @@
 ///
 /// The metadata is a dictionary of dictionaries of strings, under the keys `kKV...Metadata` below:
 ///
-///     Google Version 2         stereo_mode; metadata_source; pose_yaw_degrees, pose_pitch_degrees,
-///     pose_roll_degrees;
-///                              cube_layout, cube_padding; projection_bounds_top, _bottom, _left,
-///                              _right
-///     HDR Color and Light      display_primaries_x0, _y0, _x1, _y1, _x2, _y2, white_point_x,
-///     white_point_y, Level                    max_display_mastering_luminance,
-///     min_display_mastering_luminance;
+///     Google Version 2         stereo_mode; metadata_source;
+///                              pose_yaw_degrees, pose_pitch_degrees, pose_roll_degrees;
+///                              cube_layout, cube_padding;
+///                              projection_bounds_top, _bottom, _left, _right
+///     HDR Color and            display_primaries_x0, _y0, _x1, _y1, _x2, _y2;
+///     Light Level              white_point_x, white_point_y;
+///                              max_display_mastering_luminance, min_...;
 ///                              max_content_light_level, max_pic_average_light_level
-///     Standard Extensions      color_primaries, color_transfer, color_matrix; field_fields,
-///     field_detail;
-///                              pixel_aspect_h, pixel_aspect_v
+///     Standard Extensions      color_primaries, color_transfer, color_matrix;
+///                              field_fields, field_detail; pixel_aspect_h, pixel_aspect_v
 ///     Google Version 1, XMP    the names of XML elements and attributes
 ///
 /// Integers are printed with "%d" (fields of 16 bits unsigned), angles with "%.6f" in degrees. When
@@ -40,12 +39,12 @@
 /// docs/media.md tells the bytes.
 ///
 /// What is read is not always what can be written back:
-///  - `field_detail` reads as the value of `field_fields`, and `pixel_aspect_v` as that of
-///  `pixel_aspect_h`.
-///  - `colr` is written in a layout that is not the one which is read; see `setImageDescColorInfo`.
-///  - First-generation metadata always says "equirectangular", and elements that it adds by default
-///  stand inside
-///    an element of their own name.
+///
+/// - `field_detail` reads as `field_fields`, and `pixel_aspect_v` as `pixel_aspect_h`.
+/// - `colr` is written in a layout that is not the one which is read; see `setImageDescColorInfo`.
+/// - First-generation metadata always says "equirectangular".
+/// - Elements that it adds by default stand inside an element of their own name.
+///
 /// So give `setMetadata` what is to change, not all that was read.
 ///
 /// Statuses are those of KVAtomBoxFile.

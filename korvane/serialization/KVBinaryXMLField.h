@@ -15,11 +15,11 @@
 /// The getters convert. Those for numbers:
 ///
 /// - from an integer: the low bits for a narrower type, the nearest value for a floating one;
-/// - from a `float` or `double` to an integer: cut toward zero, NaN gives 0, what is out of range
-/// the nearest end;
+/// - from a `float` or `double` to an integer: cut toward zero; NaN gives 0, what is out of range
+///   the nearest end;
 /// - from a string: what `strtol`, `strtoul` (base 10), `strtof` or `strtod` read at its start, so
-/// 0 where there is no number; false for a
-///   result out of range, with the output set to the nearest one;
+///   0 where there is no number; false for a result out of range, with the output set to the
+///   nearest one;
 /// - from a time or a UUID: true, with the output left as it was.
 class KV_EXPORT KVBinaryXMLField {
 public:

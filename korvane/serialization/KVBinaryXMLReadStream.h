@@ -20,11 +20,10 @@ class KVStream;
 /// Where it differs from the text form:
 ///
 /// - of several values in one element only the last one stays;
-/// - an element that no scope names is passed over unread, in one step of the stream; so is the
-/// rest of an element at `ignoreElement`, which
-///   pushes no handler;
-/// - `parse` leaves the host's own handler on the stack, and after a failure all that there are:
-/// call `popAllHandlers`.
+/// - an element that no scope names is passed over unread, in one step of the stream;
+/// - so is the rest of an element at `ignoreElement`, which pushes no handler;
+/// - `parse` leaves the host's own handler on the stack, and after a failure all that there are;
+///   call `popAllHandlers`.
 ///
 /// A document may come from anywhere. What it says of lengths and counts is believed as far as
 /// there are bytes for it: memory grows with what has really been read. Depth costs memory too, but

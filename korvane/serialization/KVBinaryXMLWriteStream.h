@@ -24,8 +24,7 @@ class KVStream;
 /// - of several values in one element a reader gives the last;
 /// - whole-number floats become integers, so -0.0 comes back as 0;
 /// - an attribute that is an empty string is not counted, so that readers take its bytes for the
-/// start of the body, or it is lost if it is the only one: leave it
-///   out;
+///   start of the body, or it is lost if it is the only one: leave it out;
 /// - an attribute written after a value or a child of its element is lost;
 /// - optional attributes, arrays and blank lines are left out;
 /// - of a size above 4 GiB the low 32 bits are written, which is logged.

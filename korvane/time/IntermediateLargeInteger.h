@@ -37,8 +37,8 @@ KV_EXPORT void bignum_s256_divide(bignum_s256 const* a, bignum_s256 const* b, bi
 /// others.
 ///
 ///     // 2^62 * 3 / 6, as a time
-///     IntermediateLargeInteger::makeCMTime(IntermediateLargeInteger::product(1ll << 62, 3), 6,
-///     false, false);
+///     auto const product = IntermediateLargeInteger::product(1ll << 62, 3);
+///     CMTime const time = IntermediateLargeInteger::makeCMTime(product, 6, false, false);
 class KV_EXPORT IntermediateLargeInteger {
 public:
     constexpr IntermediateLargeInteger(long long value = 0) noexcept

@@ -27,6 +27,11 @@ std::string versionText()
 
 } // namespace
 
+void addExamples(CLI::App& family, std::string const& lines)
+{
+    family.footer("Examples:\n" + lines + "\n\n" + family.get_footer());
+}
+
 std::unique_ptr<CLI::App> makeApp()
 {
     auto app =

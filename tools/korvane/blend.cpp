@@ -154,4 +154,7 @@ void addBlendCommands(CLI::App& program)
     family.require_subcommand(1);
     addList(family);
     addProperties(family);
+
+    addExamples(family, "  korvane blend list --layer\n"
+                        "  korvane blend properties add multiply");
 }

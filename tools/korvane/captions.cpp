@@ -368,7 +368,7 @@ void addCaptionsCommands(CLI::App& program)
     CLI::App& showCommand =
         *captions.add_subcommand("show", "List the captions of a file as the library reads them");
     showCommand.add_option("FILE", showOptions->file, "A SubRip file")->required();
-    showCommand.add_option("--frame", showOptions->frame, frameHelp);
+    showCommand.add_option("--frame", showOptions->frame, frameHelp)->type_name("TIME");
     showCommand.add_flag("--tags", showOptions->tags, "Print styles as tags");
     addJsonFlag(showCommand, showOptions->json);
     showCommand.callback([showOptions] { show(*showOptions); });
@@ -378,10 +378,11 @@ void addCaptionsCommands(CLI::App& program)
         "convert", "Move a file's captions in time, and onto whole frames");
     convertCommand.add_option("IN", convertOptions->input, "A SubRip file")->required();
     convertCommand.add_option("OUT", convertOptions->output, "The file to write")->required();
-    convertCommand.add_option("--frame", convertOptions->frame, frameHelp);
+    convertCommand.add_option("--frame", convertOptions->frame, frameHelp)->type_name("TIME");
     convertCommand
         .add_option("--offset", convertOptions->offset,
                     "What is added to all times, such as -01:00:00 or 2.5")
+        ->type_name("TIME")
         ->capture_default_str();
     convertCommand.add_flag("--tags", convertOptions->tags, "Write styles as tags");
     convertCommand.callback([convertOptions] { convert(*convertOptions); });
@@ -390,9 +391,16 @@ void addCaptionsCommands(CLI::App& program)
     CLI::App& checkCommand = *captions.add_subcommand(
         "check", "Tell line by line what is wrong with a file: 1 where there are errors");
     checkCommand.add_option("FILE", checkOptions->file, "Any file")->required();
-    checkCommand.add_option("--repair", checkOptions->repair,
-                            "Write what can be saved to this file, and list each repair");
-    checkCommand.add_option("--frame", checkOptions->frame, frameHelp);
+    checkCommand
+        .add_option("--repair", checkOptions->repair,
+                    "Write what can be saved to this file, and list each repair")
+        ->type_name("FILE");
+    checkCommand.add_option("--frame", checkOptions->frame, frameHelp)->type_name("TIME");
     addJsonFlag(checkCommand, checkOptions->json);
     checkCommand.callback([checkOptions] { check(*checkOptions); });
+
+    addExamples(
+        captions,
+        "  korvane captions check lighthouse.srt\n"
+        "  korvane captions convert lighthouse.srt later.srt --offset 2.5 --frame 1001/24000");
 }

@@ -1,5 +1,7 @@
 #pragma once
 
+#include <string>
+
 namespace CLI {
 class App;
 }
@@ -10,6 +12,10 @@ class App;
 ///
 /// A command's work is its callback. It throws ToolError to end with a message and an exit code.
 using AddCommands = void (*)(CLI::App& program);
+
+/// Puts command lines, two blanks in front of each, into the help of a family and the EXAMPLES of
+/// its manual page. A test runs them over examples/data.
+void addExamples(CLI::App& family, std::string const& lines);
 
 void addBlendCommands(CLI::App& program);
 void addCaptionsCommands(CLI::App& program);

@@ -449,4 +449,8 @@ void addLutCommands(CLI::App& program)
     addConvert(family);
     addApply(family);
     addPlot(family);
+
+    addExamples(family, "  korvane lut info warm-evening.cube\n"
+                        "  korvane lut convert warm-evening.cube warm-evening.mga --size 33\n"
+                        "  korvane lut apply warm-evening.cube 0.5 0.4 0.3");
 }

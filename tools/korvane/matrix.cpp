@@ -244,4 +244,8 @@ void addMatrixCommands(CLI::App& program)
     addDecompose(family);
     addInvert(family);
     addCompose(family);
+
+    addExamples(family, "  korvane matrix decompose camera.txt\n"
+                        "  korvane matrix compose --rotate 0 30 0 --translate 3.2 1.65 -7.4 | "
+                        "korvane matrix invert -");
 }

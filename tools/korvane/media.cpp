@@ -13,4 +13,9 @@ void addMediaCommands(CLI::App& program)
     addMediaInfo(media);
     addMediaSet(media);
     addMediaStrip(media);
+
+    addExamples(media, "  korvane media tree movie.mp4\n"
+                       "  korvane media set movie.mp4 sphere.mp4 --spherical equirectangular "
+                       "--hdr mastering.json\n"
+                       "  korvane media strip sphere.mp4 plain.mp4 --spherical");
 }

@@ -227,4 +227,6 @@ void addRangesCommands(CLI::App& program)
         command.footer(rangesFooter);
         command.callback([options, operation = row.operation] { runRanges(*options, operation); });
     }
+
+    addExamples(ranges, "  korvane ranges subtract 0..10=interview 3..4 --timeline");
 }

@@ -298,4 +298,8 @@ void addSceneCommands(CLI::App& program)
         ->required();
     addJsonFlag(diffCommand, options->json);
     diffCommand.callback([options] { diff(options->file, options->output, options->json); });
+
+    addExamples(family, "  korvane scene show showreel.vzml\n"
+                        "  korvane scene convert showreel.vzml showreel.vzb --to binary\n"
+                        "  korvane scene diff showreel.vzml showreel.vzb");
 }

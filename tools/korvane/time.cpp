@@ -158,4 +158,7 @@ void addTimeCommands(CLI::App& program)
     addJsonFlag(time, options->json);
     time.footer(timeFooter);
     time.callback([options] { runTime(*options); });
+
+    addExamples(time, "  korvane time \"1001/30000 * 30000\"\n"
+                      "  korvane time floor 3.52 --frame 1001/24000");
 }

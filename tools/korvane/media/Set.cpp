@@ -327,8 +327,10 @@ void addMediaSet(CLI::App& media)
     setCommand.add_option("--source", setOptions->source, "What made the metadata");
     setCommand.add_flag("--first-generation", setOptions->firstGeneration,
                         "Also write spherical metadata of the first generation, for old players");
-    setCommand.add_option("--hdr", setOptions->hdr,
-                          "A JSON file of mastering display and content light numbers");
+    setCommand
+        .add_option("--hdr", setOptions->hdr,
+                    "A JSON file of mastering display and content light numbers")
+        ->type_name("FILE");
     setCommand.add_option("--colour,--color", setOptions->colour,
                           "P,T,M: primaries, transfer, matrix (ITU-T H.273)");
     setCommand.add_option("--pixel-aspect", setOptions->pixelAspect, "H:V");

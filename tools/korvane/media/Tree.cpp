@@ -95,8 +95,10 @@ void addMediaTree(CLI::App& media)
     CLI::App& treeCommand =
         *media.add_subcommand("tree", "Print the atoms of a movie with their offsets and sizes");
     treeCommand.add_option("FILE", treeOptions->file, "A QuickTime or MP4 file")->required();
-    treeCommand.add_option("--against", treeOptions->against,
-                           "Mark what is not as in this file: * changed, + new, - gone, > moved");
+    treeCommand
+        .add_option("--against", treeOptions->against,
+                    "Mark what is not as in this file: * changed, + new, - gone, > moved")
+        ->type_name("FILE");
     addJsonFlag(treeCommand, treeOptions->json);
     treeCommand.callback([treeOptions] { tree(*treeOptions); });
 }
