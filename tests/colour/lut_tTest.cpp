@@ -126,7 +126,7 @@ TEST(lut_t, ATableThatIsNotAsItsSizeTellsIsWrittenAsFarAsItGoes)
         char const* told;
     } const rows[] = {{1024, 1024, 341, 1, "in 1073741824\n"},
                       {256, 42, 14, 1, "in 16777216\n"},
-                      {2, 15, 5, 3, "in 8\n"},
+                      {2, 14, 4, 1, "in 8\n"},
                       {-5, 4, 0, 0, "in 0\n"},
                       {2000000000, 4, 1, 1, "in "}};
     for (auto const& row : rows) {
