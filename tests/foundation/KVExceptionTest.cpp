@@ -22,6 +22,9 @@ TEST(KVException, NamesOfTheTree)
         char const* expected;
     } const rows[] = {
         {KVNullPointerException().className(), "KVNullPointerException"},
+        {KVIllegalArgumentException().className(), "KVIllegalArgumentException"},
+        {KVUnsupportedOperationException().className(), "KVUnsupportedOperationException"},
+        {KVDivideByZeroException().className(), "KVDivideByZeroException"},
         {KVMatrixErrorException().className(), "KVMatrixErrorException"},
         // These four go by their parent's name, on purpose.
         {KVException_ScopeUndefined().className(), "KVException"},

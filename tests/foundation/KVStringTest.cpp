@@ -313,6 +313,7 @@ TEST(KVString, FormatsInTheCLocaleAndCutsAtAWholeCharacter)
 {
     EXPECT_EQ(KVString::format(short(-3)), "-3");
     EXPECT_EQ(KVString::format(-2147483647 - 1), "-2147483648");
+    EXPECT_EQ(KVString::format(1L << 40), "1099511627776");
     EXPECT_EQ(KVString::format(0.5f), "0.5");
     EXPECT_EQ(KVString::format(1e-7), "1e-07");
     if (std::setlocale(LC_NUMERIC, "de_DE.UTF-8")) {

@@ -43,6 +43,7 @@ TEST(CMTime, Adds)
         {plusInfinity, minusInfinity, invalid},
         {plusInfinity, T(1, 1), plusInfinity},
         {indefinite, minusInfinity, minusInfinity},
+        {T(1, 1), indefinite, indefinite},
         // A negative timescale is that of the negated value; 0 is none.
         {T(1, -2), T(1, 2), T(0, 2)},
         {T(1, -2), T(1, -2), T(2, -2)},
@@ -115,6 +116,7 @@ TEST(CMTime, Multiplies)
         {T(highest, 0x7FFFFFFF), lowest, minusInfinity},
         {plusInfinity, -2, minusInfinity},
         {minusInfinity, 0, invalid},
+        {indefinite, 0, indefinite},
         {invalid, 1, invalid},
     };
     for (Row const& row : rows)
@@ -176,6 +178,7 @@ TEST(CMTime, ConvertsTheTimescale)
         {T(lowest, 4), 2, half, T(lowest / 2, 2)},
         {T(1, 2), 0, half, invalid},
         {T(1, 2), -2, half, invalid},
+        {T(lowest, 1), 1, half, T(lowest, 1)},
         {indefinite, -2, half, indefinite},
         {T(5, 7, 13), 2, half, T(5, 7, 13)}, // not numeric: as it is
     };

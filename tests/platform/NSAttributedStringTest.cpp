@@ -128,6 +128,8 @@ TEST(NSAttributedString, RunsFromOutsideAreMended)
     EXPECT_EQ(coloursOf(&string), "rrr...");
     EXPECT_EQ(string.runs().size(), 2u);
     EXPECT_EQ(string.runs().back().end, 6u);
+    NSAttributedString const shorter("ab", std::vector<NSAttributedString::Run>());
+    EXPECT_EQ(coloursOf(&shorter), "..");
 }
 
 TEST(NSAttributedString, TraitsComeAndGoAndGiveAFontWhereThereIsNone)

@@ -183,6 +183,18 @@ TEST(KVBinaryXMLWriteStream, WritesElementsWithTheirSizes)
          "\0\2\7\0\0\0\1\2\x28\0\0\0\x3F"
          "\0\2\1\0\0\0\0"
          "\x81"s},
+        {"attributes of every kind of number",
+         element(1,
+                 [](auto& s) {
+                     s.writeAttribute(2, 2u);
+                     s.writeAttribute(2, -2LL);
+                     s.writeAttribute(2, 2ULL);
+                     s.writeAttribute(2, 0.5);
+                     s.writeAttribute(2, CMTimeMake(1, 600));
+                     s.writeAttribute(2, KVUUID{{1, 2, 3, 4}});
+                 }),
+         "\1\x2E\0\0\0\6\2\x08\2\2\x18\2\2\x08\2\2\x29\0\0\0\0\0\0\xE0\x3F\2\x32\4\1\x58\2\1\0"
+         "\2\x2A\1\0\0\0\2\0\0\0\3\0\0\0\4\0\0\0"s},
         {"what is left out",
          element(1,
                  [](auto& s) {

@@ -317,6 +317,12 @@ TEST(KVXMLReadStream, LooksForTheRootInAMegabyte)
     std::string const comment = "<!-- " + std::string(700000, 'x') + " -->";
     EXPECT_TRUE(parses(comment + "<vzml/>"));
     EXPECT_FALSE(parses(comment + comment + "<vzml/>"));
+    TemporaryFolder const folder; // of a file it is looked for piece by piece
+    SceneRecorder recorder;
+    KVXMLReadStream stream(urlOf(folder.write("long.vzml", comment + "<vzml/>")));
+    stream.pushHandler(&recorder);
+    EXPECT_TRUE(stream.parse());
+    EXPECT_EQ(recorder.log, "(vzml ()vzml ) ");
 }
 
 TEST(KVXMLReadStream, ReadsDeepAndLongDocuments)
