@@ -80,6 +80,7 @@ TEST(KVCaption, EachFieldOfCEA608Counts)
         EXPECT_TRUE(caption.isEqual(other));
         (other.get()->*set)(9);
         EXPECT_FALSE(caption.isEqual(other));
+        EXPECT_TRUE(other->copy()->isEqual(other));
     }
 }
 
@@ -105,7 +106,7 @@ TEST(KVCaptionSRT, IsAlwaysOnBlack)
     NSRange range;
     EXPECT_TRUE(caption.copyBackgroundColorAtIndex(1, &range)->isEqual(NSColor::blackColor()));
     EXPECT_EQ(range, (NSRange{0, 4}));
-    EXPECT_TRUE(KVCaptionSRT(red, twoSeconds).isEqual(&caption));
+    EXPECT_TRUE(KVCaptionSRT(red, twoSeconds).mutableCopy()->isEqual(caption.copy()));
     EXPECT_TRUE(red->attribute(NSBackgroundColorAttributeName, 0)->isEqual(NSColor::named("red")))
         << "the string that was given is copied";
 }
@@ -144,7 +145,7 @@ TEST(KVCaptioniTT, RubyStandsOverRunsOfOneObject)
 TEST(KVCaptioniTT, RegionAndRubyCountInEquality)
 {
     KVCaptioniTT const caption(plain("漢字"), twoSeconds, "bottom");
-    auto const ruby = caption.mutableCopy(), region = caption.mutableCopy();
+    auto const ruby = caption.mutableCopy(), region = ruby->copy();
     ruby->setRubyText("かんじ", {0, 2});
     region->setRegionString("top");
     EXPECT_FALSE(caption.isEqual(ruby));

@@ -236,6 +236,28 @@ TEST(SRTImport, Timecodes)
 
 // --- Tags ---
 
+TEST(SRTTags, TokensAreTagsAndWhatStandsBetween)
+{
+    struct Row {
+        char const* text;
+        std::vector<KVString> tokens;
+    } const rows[] = {
+        {"", {}},
+        {"a<b>c</b>d", {"a", "<b>", "c", "</b>", "d"}},
+        {"<b}{i>a < b", {"<b}", "{i>", "a ", "< b"}},
+        {"a>b}c<><", {"a>b}c", "<>", "<"}},
+    };
+    auto const importer = KVMakeRef<Importer>();
+    for (Row const& row : rows)
+        EXPECT_EQ(importer->_tokenizeString(row.text, "<{", ">}"), row.tokens) << row.text;
+    EXPECT_TRUE(importer->_tokenizeString("a<b>", KVString(), ">").empty());
+
+    auto const styled =
+        importer->_attributedStringFromString("ab", true, false, true, NSColor::named("red"));
+    EXPECT_EQ(stylesOf(styled), "55");
+    EXPECT_EQ(coloursOf(styled), "ff0000");
+}
+
 TEST(SRTTags, TokensHaveAKind)
 {
     struct Row {
@@ -333,6 +355,8 @@ TEST(SRTTags, AColourStaysForTheCaptionsBehindIt)
 TEST(SRTTags, PropertiesTakePart)
 {
     auto const importer = KVMakeRef<Importer>();
+    EXPECT_EQ(importer->tagBeginningCharacters().toUTF8(), "<{");
+    EXPECT_EQ(importer->tagEndingCharacters().toUTF8(), ">}");
     EXPECT_EQ(importer->taggedFontColorSpace().toUTF8(), "sRGB");
     importer->setTagBeginningCharacters("«[");
     importer->setTagEndingCharacters("»]");

@@ -53,6 +53,20 @@ std::vector<Exact> samples(unsigned int bits)
 
 } // namespace
 
+TEST(Bignum, ExtendsSigns)
+{
+    for (std::int64_t const x : {std::int64_t{0}, std::int64_t{-5}, highest, lowest}) {
+        bignum_s128 narrow;
+        bignum_s128_init_from_s64(x, &narrow);
+        EXPECT_EQ(narrow.limbs,
+                  (std::array<std::uint64_t, 2>{static_cast<std::uint64_t>(x), x < 0 ? ~0ull : 0}));
+        bignum_s256 wide;
+        bignum_s256_init_from_s64(x, &wide);
+        EXPECT_TRUE(equal(Large(wide), large(x)));
+        EXPECT_TRUE(equal(Large::product(x, lowest), large(Exact(x) * lowest)));
+    }
+}
+
 TEST(Bignum, AgreesWithExactIntegers)
 {
     for (Exact const& a : samples(255))

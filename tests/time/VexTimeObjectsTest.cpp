@@ -70,8 +70,8 @@ TEST(VexTimeRangeObj, HasEndsThatCanBeSet)
 
 TEST(VexTimeRangeObj, SortsByStart)
 {
-    auto const early = KVMakeRef<VexTimeRangeObj>(R(1, 9)),
-               late = KVMakeRef<VexTimeRangeObj>(R(2, 3));
+    auto const early = VexTimeRangeObj::initWithCMTimeRange(R(1, 9)),
+               late = VexTimeRangeObj::initWithVexTimeRange(R(2, 3));
     EXPECT_EQ(early->sortByStartTimeAscending(late), kCFCompareLessThan);
     EXPECT_EQ(early->sortByStartTimeDescending(late), kCFCompareGreaterThan);
     EXPECT_EQ(early->sortByStartTimeAscending(nullptr), kCFCompareGreaterThan);
@@ -98,6 +98,7 @@ TEST(VexTimeRangeAndObject, BelongsToItsObject)
     KVString const name("clip");
     auto const range = VexTimeRangeAndObject::rangeAndObjectWithRange(R(1, 3), name.cf_str());
     EXPECT_EQ(range->representedToolObject(), name.cf_str());
+    EXPECT_EQ(range->startTimeObject()->time(), T(1, 1));
     EXPECT_EQ(range->durationObject()->time(), T(2, 1));
     EXPECT_EQ(text(range->description()), "[1.000000, 3.000000) clip");
 
