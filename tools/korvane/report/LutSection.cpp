@@ -5,6 +5,7 @@
 #include "../LutFile.h"
 #include "../LutLookup.h"
 #include "../LutPlot.h"
+#include "../Markup.h"
 #include "../Numbers.h"
 
 #include <algorithm>
@@ -16,14 +17,13 @@ constexpr std::size_t mostTables = 8;
 constexpr int mostTiles = 17;
 constexpr int margin = 44; ///< left of the curves, for the numbers of the axis
 
-/// A drawing of `lutPanel` units, which is shown in `side` pixels.
-std::string panel(std::string const& drawing, int side, std::string const& id,
+/// A drawing of `lutPanel` units, stretched over so many pixels.
+std::string panel(std::string const& drawing, int width, int height, std::string const& id,
                   std::string const& title, std::string const& description)
 {
-    Svg svg(side, side);
-    svg.add("<svg width=\"" + std::to_string(side) + "\" height=\"" + std::to_string(side) +
-            "\" viewBox=\"0 0 " + std::to_string(lutPanel) + " " + std::to_string(lutPanel) +
-            "\">\n" + drawing + "</svg>\n");
+    Svg svg(width, height);
+    svg.add("<g transform=\"scale(" + decimal(width / double{lutPanel}, 4) + " " +
+            decimal(height / double{lutPanel}, 4) + ")\">\n" + drawing + "</g>\n");
     return "<figure>" + svg.html(id, title, description) + "<figcaption>" + shownText(title) +
            "</figcaption></figure>\n";
 }
@@ -55,13 +55,20 @@ std::string slicesHtml(cc::lut_t const& table, cc::lut_t::processor_t const& loo
     for (int i = 0; i < 4; ++i) {
         float const part = static_cast<float>(i) / 3;
         float const blue = table.domainMin + (table.domainMax - table.domainMin) * part;
-        html +=
-            panel(lutSlice(table, lookup, part, mostTiles), 160, id + "-slice" + std::to_string(i),
-                  "Slice at blue " + shortest(std::round(blue * 1000) / 1000),
-                  "Red grows to the right, green upwards.");
+        html += panel(lutSlice(table, lookup, part, mostTiles), 160, 160,
+                      id + "-slice" + std::to_string(i),
+                      "Blue " + shortest(std::round(blue * 1000) / 1000),
+                      "Red grows to the right, green upwards.");
     }
-    return "<figure><div class=\"panels slices\">" + html +
-           "</div><figcaption>Red grows to the right, green upwards</figcaption></figure>\n";
+    return html;
+}
+
+std::string rampsHtml(cc::lut_t const& table, cc::lut_t::processor_t const& lookup,
+                      std::string const& id)
+{
+    return panel(lutRamps(table, lookup), 688, 110, id + "-ramps",
+                 "A grey ramp, and below it what the table makes of it",
+                 "Dark to light from left to right.");
 }
 
 std::string rangesHtml(cc::lut_t const& table)
@@ -70,7 +77,7 @@ std::string rangesHtml(cc::lut_t const& table)
     auto const channels = channelNames(table);
     for (std::size_t i = 0; i < channels.size(); ++i) {
         auto const [least, greatest] = rangeOf(table, i);
-        html += (i ? "<br>" : "") + shortest(least) + " to " + shortest(greatest) + " in " +
+        html += (i ? "<br>" : "") + decimal(least, 4) + " to " + decimal(greatest, 4) + " in " +
                 channels[i];
     }
     return html;
@@ -95,13 +102,9 @@ std::string lutHtml(ReopenableFile const& file, std::string const& id)
             .add("Domain", shortest(table.domainMin) + " to " + shortest(table.domainMax))
             .addHtml("Values", rangesHtml(table));
         html += facts.html() + "<h3>Curves and slices</h3>\n<div class=\"panels\">" +
-                curvesHtml(table, *lookup, own + "-curves") +
-                (table.kind == cc::lut_t::k3D
-                     ? slicesHtml(table, *lookup, own)
-                     : panel(lutRamps(table, *lookup), 320, own + "-ramps",
-                             "A grey ramp, and what the table makes of it",
-                             "The ramp above, what the table makes of it below.")) +
-                "</div>\n";
+                curvesHtml(table, *lookup, own + "-curves") + "<div class=\"panels aside\">" +
+                (table.kind == cc::lut_t::k3D ? slicesHtml(table, *lookup, own) : "") +
+                rampsHtml(table, *lookup, own) + "</div></div>\n";
     }
     if (tables.size() > mostTables)
         html += note("and " + grouped(tables.size() - mostTables) + " more tables");

@@ -94,6 +94,13 @@ std::string pictureHtml(Square const& square, double side, bool isLarge, std::st
     svg.line(1, view.y(0), side - 1, view.y(0), "line");
     svg.line(view.x(0), 1, view.x(0), side - 1, "line");
     svg.path(view.outline(unitSquare), "unit");
+    if (isLarge) {
+        svg.text(view.x(0) - 5, view.y(0) + 13, "0", "end soft");
+        svg.text(view.x(1), view.y(0) + 13, "1", "mid soft");
+        svg.text(view.x(0) - 5, view.y(1) + 4, "1", "end soft");
+        svg.text(side - 8, view.y(0) - 6, "x", "end soft");
+        svg.text(view.x(0) + 7, 15, "y", "soft");
+    }
     svg.path(view.outline(square), "c0");
     svg.path("M" + view.at(square[0]) + "L" + view.at(square[1]), "xaxis");
     svg.path("M" + view.at(square[0]) + "L" + view.at(square[3]), "yaxis");

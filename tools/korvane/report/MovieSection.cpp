@@ -109,7 +109,7 @@ void drawPiece(Svg& svg, Piece const& piece, double x, double y, double width, d
         svg.text(x + width / 2, y + height / 2 + (isTall ? -3 : 4), name, "mid");
     std::string const size = bytesText(piece.size);
     if (isTall && widthOf(size) <= width)
-        svg.text(x + width / 2, y + height / 2 + 13, size, "mid soft");
+        svg.text(x + width / 2, y + height / 2 + 13, size, "mid small");
 }
 
 /// The place of a piece in a strip.
@@ -335,7 +335,7 @@ std::string atomsTable(MovieComparison const& movie, bool isCompared)
             cells.insert(cells.end(),
                          {kindNames[change.kind], before ? grouped(before->offset) : "",
                           before ? grouped(before->size) : ""});
-        table.row(cells, isCompared && change.kind > AtomChange::Moved ? "flag" : "");
+        table.row(cells, kindClasses[change.kind]);
     }
     return table.html("atoms");
 }

@@ -63,8 +63,9 @@ section {
 .scroll > svg { display: block; }
 .panels { display: flex; flex-wrap: wrap; gap: 16px 20px; align-items: flex-start; }
 .panels figure { margin: 0; max-width: 100%; }
+.aside { flex: 1 1 340px; min-width: 0; max-width: 720px; gap: 12px 16px; }
 .panels .scroll > svg { max-width: 100%; height: auto; }
-figcaption { color: var(--soft); font-size: 13px; margin-top: 4px; }
+figcaption { color: var(--soft); font-size: 13px; margin-top: 4px; max-width: 420px; }
 .legend { display: flex; flex-wrap: wrap; gap: 4px 16px; padding: 0; margin: 8px 0 10px; list-style: none; font-size: 13px; color: var(--soft); }
 .patch { vertical-align: -1px; margin-right: 6px; }
 details > summary { cursor: pointer; }
@@ -77,8 +78,10 @@ th, td { text-align: left; padding: 4px 12px; vertical-align: top; border-bottom
 th { position: sticky; top: 0; background: var(--head); color: var(--soft); font-weight: 600; white-space: nowrap; }
 td.n, th.n { text-align: right; font-variant-numeric: tabular-nums; white-space: nowrap; }
 tfoot td { color: var(--soft); font-style: italic; }
-td:not(.n) { min-width: 6em; white-space: pre-line; }
-tr.flag td { background: color-mix(in srgb, var(--f4) 45%, transparent); }
+td:not(.n) { min-width: 7.5em; white-space: pre-line; }
+tr.flag td, tr.gone td { background: color-mix(in srgb, var(--f4) 45%, transparent); }
+tr.changed td { background: color-mix(in srgb, var(--f1) 45%, transparent); }
+tr.new td { background: color-mix(in srgb, var(--f2) 45%, transparent); }
 .tree { margin: 8px 0 0; font-size: 13.5px; }
 .tree ul { margin: 0; padding-left: 18px; list-style: none; border-left: 1px solid var(--grid); }
 .tree > ul { padding-left: 0; border: 0; }
@@ -88,6 +91,7 @@ tr.flag td { background: color-mix(in srgb, var(--f4) 45%, transparent); }
 .matrix td { text-align: right; font-variant-numeric: tabular-nums; }
 svg text { font: 12px system-ui, sans-serif; fill: var(--ink); }
 svg .soft { fill: var(--soft); font-size: 11px; }
+svg .small { font-size: 11px; }
 svg .mid { text-anchor: middle; }
 svg .end { text-anchor: end; }
 svg .strong { font-weight: 600; }

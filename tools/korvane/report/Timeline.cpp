@@ -149,22 +149,34 @@ private:
         return left + across * std::clamp((seconds - begin_) / strips_.length, 0.0, 1.0);
     }
 
+    bool isHere(TimelineItem const& item) const
+    {
+        return (item.start < end_ || (item.start == end_ && isLast())) &&
+               (item.end > begin_ || item.start >= begin_);
+    }
+
     double drawStrip(double y)
     {
         double const top = y + axisHeight + (points_.empty() ? 0 : pointHeight);
-        double const bottom = top + static_cast<double>(rows_.size()) * (rowHeight + rowGap);
+        std::vector<Row const*> rows;
+        for (Row const& row : rows_)
+            if (!row.label.empty() || std::ranges::any_of(row.items, [&](TimelineItem const* item) {
+                    return isHere(*item);
+                }))
+                rows.push_back(&row);
+        double const bottom = top + static_cast<double>(rows.size()) * (rowHeight + rowGap);
         drawAxis(y, bottom - rowGap);
         double rowTop = top;
-        for (std::size_t i = 0; i < rows_.size(); ++i) {
+        for (std::size_t i = 0; i < rows.size(); ++i) {
             svg_.rect(left, rowTop, across, rowHeight, "lane");
             rowTop += rowHeight + rowGap;
         }
         drawPoints(y + axisHeight, bottom - rowGap);
         rowTop = top;
-        for (Row const& row : rows_) {
-            svg_.text(left - 10, rowTop + 24, fitted(row.label, left - 14), "end soft");
-            drawBars(row, rowTop);
-            drawOverlaps(row, rowTop);
+        for (Row const* row : rows) {
+            svg_.text(left - 10, rowTop + 24, fitted(row->label, left - 14), "end soft");
+            drawBars(*row, rowTop);
+            drawOverlaps(*row, rowTop);
             rowTop += rowHeight + rowGap;
         }
         return bottom;
@@ -193,23 +205,14 @@ private:
                 here.push_back(&point);
         for (std::size_t i = 0; i < here.size(); ++i) {
             double const x = xOf(here[i]->at);
-            double const next = i + 1 < here.size() ? xOf(here[i + 1]->at) : right;
-            double const width = widthOf(here[i]->label);
+            double const next = i + 1 < here.size() ? xOf(here[i + 1]->at) - 8 : right;
             svg_.line(x, y + 12, x, bottom, "pointline");
             svg_.path("M" + decimal(x) + " " + decimal(y + 3) + "l5 5l-5 5l-5 -5z", "point",
                       here[i]->label + ", " + timecodeText(here[i]->at));
-            if (x + 10 + width < next - 8 || (i + 1 == here.size() && x + 10 + width < right))
-                svg_.text(x + 9, y + 12, here[i]->label);
-            else if (i + 1 == here.size() &&
-                     (i == 0 ||
-                      x - 10 - width > xOf(here[i - 1]->at) + 8 + lastLabelWidth(here, i)))
-                svg_.text(x - 9, y + 12, here[i]->label, "end");
+            svg_.text(x + 9, y + 12, fitted(here[i]->label, next - x - 9));
         }
     }
-    static double lastLabelWidth(std::vector<TimelinePoint const*> const& points, std::size_t i)
-    {
-        return widthOf(points[i - 1]->label) + 9;
-    }
+
     bool isLast() const
     {
         return end_ >= strips_.origin + strips_.length * (static_cast<double>(strips_.count) - 0.5);
@@ -219,8 +222,7 @@ private:
     {
         std::vector<Bar> bars;
         for (TimelineItem const* item : row.items) {
-            if (item->start >= end_ || std::max(item->end, item->start) < begin_ ||
-                (item->end <= begin_ && item->start < begin_))
+            if (!isHere(*item))
                 continue;
             double const from = xOf(item->start);
             double const to = std::min(std::max(xOf(item->end), from + narrowest), right + 1);
@@ -256,7 +258,7 @@ private:
         // The second line in smaller letters.
         if (std::string const text = fitted(bar.item->note, (width - 10) * 1.09);
             isOne && !text.empty())
-            svg_.text(bar.from + 6, y + 32, text, "soft");
+            svg_.text(bar.from + 6, y + 32, text, "small");
     }
 
     void drawOverlaps(Row const& row, double y)
