@@ -60,7 +60,7 @@ std::string slicesHtml(cc::lut_t const& table, cc::lut_t::processor_t const& loo
                       "Blue " + shortest(std::round(blue * 1000) / 1000),
                       "Red grows to the right, green upwards.");
     }
-    return html;
+    return html + "<p class=\"axes\">In each slice red grows to the right, green upwards.</p>\n";
 }
 
 std::string rampsHtml(cc::lut_t const& table, cc::lut_t::processor_t const& lookup,

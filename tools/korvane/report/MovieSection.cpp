@@ -26,6 +26,7 @@ constexpr int deepest = 10;            ///< level that is drawn
 char const* const kindClasses[] = {"same", "moved", "changed", "new", "gone"};
 char const* const kindNames[] = {"as before", "> moved", "* changed", "+ new", "- gone"};
 
+/// What became of atoms; empty where there is nothing to compare with.
 using Kinds = std::unordered_map<MovieAtom const*, AtomChange const*>;
 
 /// Atoms side by side that are drawn as one.
@@ -34,7 +35,16 @@ struct Piece {
     std::uint64_t offset = 0, size = 0;
     std::size_t count = 1;
     AtomChange::Kind kind = AtomChange::Same;
+    char const* look = "same"; ///< a class
 };
+
+/// By what they became, else by what they are for.
+char const* lookOf(MovieAtom const& atom, Kinds const& kinds, AtomChange::Kind kind)
+{
+    if (!kinds.empty())
+        return kindClasses[kind];
+    return atom.type == "mdat" ? "c0" : atom.children.empty() ? "same" : "c1";
+}
 
 std::vector<Piece> piecesOf(std::vector<MovieAtom> const& atoms, Kinds const& kinds)
 {
@@ -50,10 +60,13 @@ std::vector<Piece> piecesOf(std::vector<MovieAtom> const& atoms, Kinds const& ki
         if (!pieces.empty() && atom.size < worth && pieces.back().size < worth) {
             Piece& piece = pieces.back();
             piece.size += atom.size;
-            piece.kind = piece.kind == kind ? kind : AtomChange::Changed;
+            if (piece.kind != kind) {
+                piece.kind = AtomChange::Changed;
+                piece.look = kindClasses[AtomChange::Changed];
+            }
             ++piece.count;
         } else {
-            pieces.push_back({&atom, atom.offset, atom.size, 1, kind});
+            pieces.push_back({&atom, atom.offset, atom.size, 1, kind, lookOf(atom, kinds, kind)});
         }
     }
     return pieces;
@@ -95,7 +108,7 @@ std::string tooltipOf(Piece const& piece)
 
 void drawPiece(Svg& svg, Piece const& piece, double x, double y, double width, double height)
 {
-    std::string classes = kindClasses[piece.kind];
+    std::string classes = piece.look;
     if (piece.count > 1 || !piece.atom)
         classes += " many";
     svg.rect(x + 0.5, y + 0.5, std::max(width - 1, 1.0), height - 1, classes, tooltipOf(piece));
@@ -128,7 +141,7 @@ public:
         std::vector<Piece> pieces = piecesOf(atoms, kinds);
         std::uint64_t const end = pieces.back().offset + pieces.back().size;
         if (end < length)
-            pieces.push_back({nullptr, end, length - end, 1, AtomChange::Same});
+            pieces.push_back({nullptr, end, length - end});
         std::vector<double> sizes;
         for (Piece const& piece : pieces)
             sizes.push_back(static_cast<double>(piece.size));
@@ -354,6 +367,9 @@ std::string movieHtml(ReopenableFile const& file, std::string const& id, std::st
             earlier.emplace(change.before, &change);
     }
 
+    Kinds const none;
+    Kinds const& marked = isCompared ? after : none;
+
     std::string notes;
     std::vector<ChunkTable> const tables = tablesOf(file.path(), notes);
     std::vector<ChunkTable> const oldTables =
@@ -382,7 +398,7 @@ std::string movieHtml(ReopenableFile const& file, std::string const& id, std::st
         oldLength = FileBytes(before).length();
     std::uint64_t const longest = std::max(movie.length, oldLength);
     Svg svg(right + 2, 0);
-    Strip const strip(movie.after, after, movie.length, longest);
+    Strip const strip(movie.after, marked, movie.length, longest);
     double y = 4;
     if (isCompared) {
         Strip const old(movie.before, earlier, oldLength, longest);
@@ -403,7 +419,7 @@ std::string movieHtml(ReopenableFile const& file, std::string const& id, std::st
     y += stripHeight;
 
     // The container that tells of all others, drawn larger.
-    Magnified magnified(svg, after, shifts);
+    Magnified magnified(svg, marked, shifts);
     auto const& boxes = strip.boxes();
     auto const inner = std::find_if(boxes.begin(), boxes.end(), [](Box const& box) {
         return box.piece.atom && box.piece.count == 1 && box.piece.atom->type == "moov" &&
@@ -418,10 +434,12 @@ std::string movieHtml(ReopenableFile const& file, std::string const& id, std::st
     }
     svg.setHeight(y + 2);
 
-    std::vector<LegendEntry> entries{{"same", isCompared ? "as before" : "atom"}};
+    std::vector<LegendEntry> entries;
     if (isCompared)
-        for (std::size_t kind = AtomChange::Moved; kind <= AtomChange::Gone; ++kind)
+        for (std::size_t kind = AtomChange::Same; kind <= AtomChange::Gone; ++kind)
             entries.push_back({kindClasses[kind], kindNames[kind]});
+    else
+        entries = {{"c0", "media data"}, {"c1", "container"}, {"same", "other atom"}};
     if (!shifts.empty())
         entries.push_back({"offsets", "chunk offsets moved"});
     Facts facts;

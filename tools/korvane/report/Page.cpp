@@ -63,6 +63,7 @@ section {
 .scroll > svg { display: block; }
 .panels { display: flex; flex-wrap: wrap; gap: 16px 20px; align-items: flex-start; }
 .panels figure { margin: 0; max-width: 100%; }
+.axes { flex: 0 0 100%; margin: 0; color: var(--soft); font-size: 13px; }
 .aside { flex: 1 1 340px; min-width: 0; max-width: 720px; gap: 12px 16px; }
 .panels .scroll > svg { max-width: 100%; height: auto; }
 figcaption { color: var(--soft); font-size: 13px; margin-top: 4px; max-width: 420px; }
@@ -106,7 +107,7 @@ svg .strong { font-weight: 600; }
 .gone { fill: var(--f4); stroke: var(--s4); stroke-dasharray: 4 2; }
 .offsets { stroke: var(--s3); stroke-width: 2.5; fill: none; }
 .many { stroke-dasharray: 2 2; }
-.overlap { fill: var(--bad); fill-opacity: .22; stroke: var(--bad); stroke-width: 1; }
+.overlap { fill: var(--bad); fill-opacity: .14; stroke: var(--bad); stroke-dasharray: 3 2; }
 .point { fill: var(--s3); stroke: none; }
 .pointline { stroke: var(--s3); stroke-dasharray: 2 3; }
 .wedge { fill: var(--sames); fill-opacity: .13; stroke: none; }

@@ -19,6 +19,7 @@ constexpr double rowGap = 6;
 constexpr double axisHeight = 24;
 constexpr double pointHeight = 20;
 constexpr double narrowest = 4;           ///< a bar, in pixels
+constexpr double widestGroup = 28;        ///< that still takes more
 constexpr std::size_t mostLanes = 6;      ///< of one track
 constexpr std::size_t mostRowsDrawn = 12; ///< of one strip
 constexpr std::size_t mostRowsInAll = 40;
@@ -218,24 +219,32 @@ private:
         return end_ >= strips_.origin + strips_.length * (static_cast<double>(strips_.count) - 0.5);
     }
 
+    /// Whether two bars would cover each other, or are both too narrow to lie side by side.
+    static bool touches(Bar const& bar, double from, double to)
+    {
+        return from < bar.to - 0.01 || (from < bar.to + 1 && bar.to - bar.from < 2 * narrowest &&
+                                        to - from < 2 * narrowest);
+    }
+
     void drawBars(Row const& row, double y)
     {
         std::vector<Bar> bars;
         for (TimelineItem const* item : row.items) {
             if (!isHere(*item))
                 continue;
-            double const from = xOf(item->start);
+            double from = xOf(item->start);
             double const to = std::min(std::max(xOf(item->end), from + narrowest), right + 1);
-            if (!bars.empty() &&
-                (from < bars.back().to - 0.01 ||
-                 (from < bars.back().to + 1 && bars.back().to - bars.back().from < 2 * narrowest &&
-                  to - from < 2 * narrowest))) {
-                bars.back().to = std::max(bars.back().to, to);
-                bars.back().end = item->end;
-                ++bars.back().count;
-            } else {
-                bars.push_back({from, to, item, 1, item->start, item->end});
+            if (!bars.empty() && touches(bars.back(), from, to)) {
+                Bar& last = bars.back();
+                if (last.to - last.from < widestGroup || to <= last.to) {
+                    last.to = std::max(last.to, to);
+                    last.end = item->end;
+                    ++last.count;
+                    continue;
+                }
+                from = last.to;
             }
+            bars.push_back({from, to, item, 1, item->start, item->end});
         }
         for (Bar const& bar : bars)
             drawBar(bar, y);
@@ -263,18 +272,22 @@ private:
 
     void drawOverlaps(Row const& row, double y)
     {
-        double drawn = 0;
+        std::vector<Bar> bands;
         for (Span const& span : row.overlaps) {
             if (span.from >= end_ || span.to <= begin_)
                 continue;
-            double const from = std::max(xOf(span.from), drawn);
+            double const from = xOf(span.from);
             double const to = std::max(xOf(span.to), from + 2);
-            if (from + 2 > right || xOf(span.to) < drawn)
-                continue;
-            svg_.rect(from, y, to - from, rowHeight, "overlap",
-                      "overlap, " + timecodeText(span.from) + " to " + timecodeText(span.to));
-            drawn = to + 2;
+            if (bands.empty() || from > bands.back().to + 2)
+                bands.push_back({from, to, nullptr, 0, span.from, span.to});
+            bands.back().to = std::max(bands.back().to, to);
+            bands.back().end = span.to;
+            ++bands.back().count;
         }
+        for (Bar const& band : bands)
+            svg_.rect(band.from, y, band.to - band.from, rowHeight, "overlap",
+                      (band.count == 1 ? "overlap, " : counted(band.count, "overlap") + ", ") +
+                          timecodeText(band.start) + " to " + timecodeText(band.end));
     }
 
     std::vector<Row> const& rows_;
