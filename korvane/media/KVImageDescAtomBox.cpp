@@ -528,7 +528,16 @@ std::size_t KVImageDescAtomBox::writeAtomBox(KVAtomBox const& atom, std::uint8_t
         std::copy(data->span().begin(), data->span().end(), buffer + written);
         return written + data->length();
     }
-    for (int i = 0; i < atom.getChildCount(); ++i)
-        written += writeAtomBox(*atom.getChild(i), buffer + written, capacity - written);
+    for (int i = 0; i < atom.getChildCount(); ++i) {
+        KVAtomBox const& child = *atom.getChild(i);
+        std::uint8_t* const start = buffer + written;
+        std::size_t const length = writeAtomBox(child, start, capacity - written);
+        // A copied size of 0, "to the end", is true of the last atom alone: it would swallow those
+        // that have been added behind it.
+        if (i + 1 < atom.getChildCount() && child.getHeaderSize() >= 8 && length >= 8 &&
+            readBigEndian(start, 4) == 0)
+            writeBigEndian(start, 4, length);
+        written += length;
+    }
     return written;
 }

@@ -32,6 +32,8 @@ std::vector<MovieAtom> planMovieTree(KVAtomBoxFile const& file);
 /// What became of an atom.
 struct AtomChange {
     enum Kind { Same, Moved, Changed, New, Gone };
+    static constexpr char marks[] = {' ', '>', '*', '+', '-'}; ///< by Kind
+    static constexpr char const* kindNames[] = {"same", "moved", "changed", "new", "gone"};
 
     Kind kind;
     int depth;

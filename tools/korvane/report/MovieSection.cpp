@@ -22,9 +22,13 @@ constexpr std::size_t mostPieces = 80; ///< side by side
 constexpr std::size_t mostNodes = 500; ///< below the top
 constexpr int deepest = 10;            ///< level that is drawn
 
-// By AtomChange::Kind; the marks are those of `korvane media tree`.
-char const* const kindClasses[] = {"same", "moved", "changed", "new", "gone"};
-char const* const kindNames[] = {"as before", "> moved", "* changed", "+ new", "- gone"};
+/// "* changed", with the marks of `korvane media tree`.
+std::string markedName(std::size_t kind)
+{
+    if (kind == AtomChange::Same)
+        return "as before";
+    return std::string(1, AtomChange::marks[kind]) + " " + AtomChange::kindNames[kind];
+}
 
 /// What became of atoms; empty where there is nothing to compare with.
 using Kinds = std::unordered_map<MovieAtom const*, AtomChange const*>;
@@ -35,14 +39,14 @@ struct Piece {
     std::uint64_t offset = 0, size = 0;
     std::size_t count = 1;
     AtomChange::Kind kind = AtomChange::Same;
-    char const* look = "same"; ///< a class
+    char const* look = "same"; ///< a class; those of changes are the names of the kinds
 };
 
 /// By what they became, else by what they are for.
 char const* lookOf(MovieAtom const& atom, Kinds const& kinds, AtomChange::Kind kind)
 {
     if (!kinds.empty())
-        return kindClasses[kind];
+        return AtomChange::kindNames[kind];
     return atom.type == "mdat" ? "c0" : atom.children.empty() ? "same" : "c1";
 }
 
@@ -62,7 +66,7 @@ std::vector<Piece> piecesOf(std::vector<MovieAtom> const& atoms, Kinds const& ki
             piece.size += atom.size;
             if (piece.kind != kind) {
                 piece.kind = AtomChange::Changed;
-                piece.look = kindClasses[AtomChange::Changed];
+                piece.look = AtomChange::kindNames[AtomChange::Changed];
             }
             ++piece.count;
         } else {
@@ -103,7 +107,7 @@ std::string tooltipOf(Piece const& piece)
     if (piece.count > 1)
         return grouped(piece.count) + " atoms from " + piece.atom->type + " on" + place;
     return piece.atom->type + place +
-           (piece.kind == AtomChange::Same ? "" : std::string(": ") + kindNames[piece.kind]);
+           (piece.kind == AtomChange::Same ? "" : ": " + markedName(piece.kind));
 }
 
 void drawPiece(Svg& svg, Piece const& piece, double x, double y, double width, double height)
@@ -114,7 +118,7 @@ void drawPiece(Svg& svg, Piece const& piece, double x, double y, double width, d
     svg.rect(x + 0.5, y + 0.5, std::max(width - 1, 1.0), height - 1, classes, tooltipOf(piece));
     std::string name = piece.count > 1 ? grouped(piece.count) : piece.atom ? piece.atom->type : "?";
     if (piece.kind != AtomChange::Same)
-        name.insert(0, std::string(kindNames[piece.kind], 2));
+        name.insert(0, markedName(piece.kind).substr(0, 2));
     if (widthOf(name) + 4 > width) // rather no mark than no name
         name.erase(0, piece.kind != AtomChange::Same ? 2 : 0);
     bool const isTall = height > levelHeight;
@@ -346,9 +350,9 @@ std::string atomsTable(MovieComparison const& movie, bool isCompared)
                                        indent + shownText((after ? after : before)->type)};
         if (isCompared)
             cells.insert(cells.end(),
-                         {kindNames[change.kind], before ? grouped(before->offset) : "",
+                         {markedName(change.kind), before ? grouped(before->offset) : "",
                           before ? grouped(before->size) : ""});
-        table.row(cells, kindClasses[change.kind]);
+        table.row(cells, AtomChange::kindNames[change.kind]);
     }
     return table.html("atoms");
 }
@@ -437,7 +441,7 @@ std::string movieHtml(ReopenableFile const& file, std::string const& id, std::st
     std::vector<LegendEntry> entries;
     if (isCompared)
         for (std::size_t kind = AtomChange::Same; kind <= AtomChange::Gone; ++kind)
-            entries.push_back({kindClasses[kind], kindNames[kind]});
+            entries.push_back({AtomChange::kindNames[kind], markedName(kind)});
     else
         entries = {{"c0", "media data"}, {"c1", "container"}, {"same", "other atom"}};
     if (!shifts.empty())
