@@ -178,7 +178,8 @@ TEST(Manual, EveryCommandAndOptionIsOfferedByTheShells)
             EXPECT_THAT(function, HasSubstr(" " + command + ") " + name + "_" + command + " ;;"));
         for (std::string const& option : entry.options)
             EXPECT_TRUE(function.find("'" + option + "[") != function.npos ||
-                        function.find("'" + option + "=[") != function.npos)
+                        function.find("'" + option + "=[") != function.npos ||
+                        function.find("'" + option + "+[") != function.npos)
                 << entry.path << " " << option;
     }
 }

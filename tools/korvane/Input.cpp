@@ -4,6 +4,8 @@
 
 #include <cerrno>
 #include <fcntl.h>
+#include <string_view>
+#include <sys/mman.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -66,4 +68,32 @@ std::string readFile(std::string const& path)
 void checkReadable(std::string const& path)
 {
     Descriptor const file(path);
+}
+
+ReopenableFile::ReopenableFile(std::string const& path) : shown_(path), path_(path)
+{
+    if (path != "-") {
+        checkReadable(path);
+        return;
+    }
+    std::string const bytes = readFile(path);
+    fd_ = memfd_create("korvane", MFD_CLOEXEC);
+    if (fd_ < 0)
+        throw inputOutput(path, errno);
+    for (std::string_view rest(bytes); !rest.empty();) {
+        ssize_t const count = write(fd_, rest.data(), rest.size());
+        if (count < 0) {
+            int const error = errno;
+            close(fd_);
+            throw inputOutput(path, error);
+        }
+        rest.remove_prefix(static_cast<std::size_t>(count));
+    }
+    path_ = "/proc/self/fd/" + std::to_string(fd_);
+}
+
+ReopenableFile::~ReopenableFile()
+{
+    if (fd_ >= 0)
+        close(fd_);
 }

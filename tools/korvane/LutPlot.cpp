@@ -1,50 +1,20 @@
 #include "LutPlot.h"
 
+#include "Markup.h"
 #include "Numbers.h"
 
 #include <algorithm>
-#include <charconv>
 #include <cmath>
 
 namespace {
 
-constexpr int panel = 320;
+constexpr int panel = lutPanel;
 constexpr int left = 60;
 constexpr int top = 50;
 constexpr int sliceLeft = left + panel + 60;
 constexpr int width = sliceLeft + panel + 20;
 constexpr int height = top + panel + 60;
 constexpr int samples = 160;
-
-std::string number(double value, int digits = 2)
-{
-    char text[400];
-    auto const end =
-        std::to_chars(std::begin(text), std::end(text), value, std::chars_format::fixed, digits)
-            .ptr;
-    return {text, end};
-}
-
-std::string escaped(std::string const& text)
-{
-    std::string result;
-    for (char const c : text)
-        switch (c) {
-        case '&':
-            result += "&amp;";
-            break;
-        case '<':
-            result += "&lt;";
-            break;
-        case '>':
-            result += "&gt;";
-            break;
-        default:
-            // XML has no place for control characters.
-            result += static_cast<unsigned char>(c) < ' ' ? ' ' : c;
-        }
-    return result;
-}
 
 /// Colours by their part of the domain, 0 to 1.
 class Domain {
@@ -76,45 +46,44 @@ private:
 
 std::string text(double x, double y, char const* anchor, std::string const& content)
 {
-    return "<text x=\"" + number(x, 0) + "\" y=\"" + number(y, 0) + "\" text-anchor=\"" + anchor +
+    return "<text x=\"" + decimal(x) + "\" y=\"" + decimal(y) + "\" text-anchor=\"" + anchor +
            "\">" + escaped(content) + "</text>\n";
 }
 
 std::string rectangle(double x, double y, double w, double h, std::string const& fill)
 {
-    return "<rect x=\"" + number(x) + "\" y=\"" + number(y) + "\" width=\"" + number(w) +
-           "\" height=\"" + number(h) + "\" fill=\"" + fill + "\"/>\n";
+    return "<rect x=\"" + decimal(x) + "\" y=\"" + decimal(y) + "\" width=\"" + decimal(w) +
+           "\" height=\"" + decimal(h) + "\" fill=\"" + fill + "\"/>\n";
 }
 
 std::string grid(cc::lut_t const& table)
 {
     std::string lines;
+    std::string const whole = std::to_string(panel);
     for (int i = 0; i <= 4; ++i) {
-        std::string const x = number(left + panel * i / 4.0, 0);
-        std::string const y = number(top + panel * i / 4.0, 0);
-        lines += "M" + x + " " + std::to_string(top) + "v" + std::to_string(panel) + "M" +
-                 std::to_string(left) + " " + y + "h" + std::to_string(panel);
+        std::string const place = std::to_string(panel * i / 4);
+        lines += "M" + place + " 0v" + whole + "M0 " + place + "h" + whole;
     }
-    return "<path d=\"" + lines + "\" stroke=\"#ddd\" fill=\"none\"/>\n" +
-           text(left, top + panel + 18, "middle", shortest(table.domainMin)) +
-           text(left + panel, top + panel + 18, "middle", shortest(table.domainMax)) +
-           text(left - 8, top + panel + 4, "end", shortest(table.domainMin)) +
-           text(left - 8, top + 4, "end", shortest(table.domainMax));
+    return "<path class=\"grid\" d=\"" + lines + "\" stroke=\"#ddd\" fill=\"none\"/>\n" +
+           text(0, panel + 18, "middle", shortest(table.domainMin)) +
+           text(panel, panel + 18, "middle", shortest(table.domainMax)) +
+           text(-8, panel + 4, "end", shortest(table.domainMin)) +
+           text(-8, 4, "end", shortest(table.domainMax));
 }
 
 std::string curve(Domain const& domain, cc::lut_t::processor_t const& lookup, std::size_t channel,
-                  char const* colour)
+                  char const* name, char const* colour)
 {
     std::string points;
     for (int i = 0; i <= samples; ++i) {
         float const part = static_cast<float>(i) / samples;
         float const in = domain.colourAt(part);
         float const out = domain.partOf(lookup.process({in, in, in})[channel]);
-        points += number(left + panel * double{part}) + "," +
-                  number(top + panel * (1.0 - double{out})) + " ";
+        points += decimal(panel * double{part}) + "," + decimal(panel * (1.0 - double{out})) + " ";
     }
-    return std::string("<polyline fill=\"none\" stroke-width=\"2\" stroke=\"") + colour +
-           "\" points=\"" + points + "\"/>\n";
+    return std::string("<polyline class=\"curve ") + name +
+           "\" fill=\"none\" stroke-width=\"2\" stroke=\"" + colour + "\" points=\"" + points +
+           "\"/>\n";
 }
 
 /// Rectangles that lie side by side. They are drawn a little larger than they are, without
@@ -124,12 +93,30 @@ std::string tiles(std::string const& rectangles)
     return "<g shape-rendering=\"crispEdges\">\n" + rectangles + "</g>\n";
 }
 
-/// Red to the right, green upwards.
-std::string cubeSlice(Domain const& domain, cc::lut_t::processor_t const& lookup, int edge,
-                      float slice)
+std::string moved(int x, int y, std::string const& elements)
 {
+    return "<g transform=\"translate(" + std::to_string(x) + " " + std::to_string(y) + ")\">\n" +
+           elements + "</g>\n";
+}
+
+} // namespace
+
+std::string lutCurves(cc::lut_t const& table, cc::lut_t::processor_t const& lookup)
+{
+    Domain const domain(table);
+    if (table.kind != cc::lut_t::k3D)
+        return grid(table) + curve(domain, lookup, 0, "all", "#333333");
+    return grid(table) + curve(domain, lookup, 2, "blue", "#2255dd") +
+           curve(domain, lookup, 1, "green", "#22aa33") +
+           curve(domain, lookup, 0, "red", "#dd2222");
+}
+
+std::string lutSlice(cc::lut_t const& table, cc::lut_t::processor_t const& lookup, float slice,
+                     int most)
+{
+    Domain const domain(table);
     std::string result;
-    int const count = std::clamp(edge, 2, 33);
+    int const count = std::clamp(table.size, 2, most);
     double const side = double{panel} / count;
     float const blue = domain.colourAt(slice);
     for (int y = 0; y < count; ++y)
@@ -137,30 +124,26 @@ std::string cubeSlice(Domain const& domain, cc::lut_t::processor_t const& lookup
             auto const step = static_cast<float>(count - 1);
             cc::rgb_t const in{domain.colourAt(static_cast<float>(x) / step),
                                domain.colourAt(static_cast<float>(y) / step), blue};
-            result += rectangle(sliceLeft + x * side, top + (count - 1 - y) * side, side + 0.3,
-                                side + 0.3, domain.fillOf(lookup.process(in)));
+            result += rectangle(x * side, (count - 1 - y) * side, side + 0.3, side + 0.3,
+                                domain.fillOf(lookup.process(in)));
         }
-    return tiles(result) + text(sliceLeft + panel / 2, top + panel + 18, "middle",
-                                "red to the right, green upwards, blue " + shortest(blue));
+    return tiles(result);
 }
 
-std::string ramps(Domain const& domain, cc::lut_t::processor_t const& lookup)
+std::string lutRamps(cc::lut_t const& table, cc::lut_t::processor_t const& lookup)
 {
+    Domain const domain(table);
     std::string result;
     double const step = double{panel} / samples;
     for (int i = 0; i < samples; ++i) {
         float const grey = domain.colourAt(static_cast<float>(i) / (samples - 1));
         cc::rgb_t const in{grey, grey, grey};
-        double const x = sliceLeft + i * step;
-        result += rectangle(x, top, step + 0.3, panel / 2, domain.fillOf(in));
-        result +=
-            rectangle(x, top + panel / 2, step + 0.3, panel / 2, domain.fillOf(lookup.process(in)));
+        double const x = i * step;
+        result += rectangle(x, 0, step + 0.3, panel / 2, domain.fillOf(in));
+        result += rectangle(x, panel / 2, step + 0.3, panel / 2, domain.fillOf(lookup.process(in)));
     }
-    return tiles(result) + text(sliceLeft + panel / 2, top + panel + 18, "middle",
-                                "a grey ramp, and behind the table");
+    return tiles(result);
 }
-
-} // namespace
 
 std::string plotLut(cc::lut_t const& table, cc::lut_t::processor_t const& lookup, float slice)
 {
@@ -175,16 +158,15 @@ std::string plotLut(cc::lut_t const& table, cc::lut_t::processor_t const& lookup
     svg +=
         text(left, 30, "start",
              table.title + (isCube ? " (" + size + " x " + size + " x " + size + ")" : " (curve)"));
-    svg += grid(table);
+    std::string curves = lutCurves(table, lookup), side;
     if (isCube) {
-        svg += curve(domain, lookup, 2, "#2255dd");
-        svg += curve(domain, lookup, 1, "#22aa33");
-        svg += curve(domain, lookup, 0, "#dd2222");
-        svg += text(left + panel / 2, top + panel + 18, "middle", "along the neutral axis");
-        svg += cubeSlice(domain, lookup, table.size, slice);
+        curves += text(panel / 2, panel + 18, "middle", "along the neutral axis");
+        side = lutSlice(table, lookup, slice, 33) +
+               text(panel / 2, panel + 18, "middle",
+                    "red to the right, green upwards, blue " + shortest(domain.colourAt(slice)));
     } else {
-        svg += curve(domain, lookup, 0, "#333333");
-        svg += ramps(domain, lookup);
+        side = lutRamps(table, lookup) +
+               text(panel / 2, panel + 18, "middle", "a grey ramp, and behind the table");
     }
-    return svg + "</svg>\n";
+    return svg + moved(left, top, curves) + moved(sliceLeft, top, side) + "</svg>\n";
 }

@@ -135,42 +135,6 @@ void checkCoverage(KVAtomBox const& box, std::string const& path)
                                  "there");
 }
 
-std::vector<ChunkTable> readTables(std::string const& path)
-{
-    KVAtomBoxFile file;
-    openMovie(file, path);
-    if (file.readAllTrackMediaAtomBoxes() != 0)
-        throw badInput(path, "has no moov atom, or more than one");
-    checkCoverage(file, path);
-    std::vector<ChunkTable> tables;
-    std::vector<KVAtomBox*> tracks;
-    file.findAllChildren(tracks, true, KVAtomType("trak"));
-    for (std::size_t i = 0; i < tracks.size(); ++i) {
-        std::string const name = tracks.size() > 1 ? "trak[" + std::to_string(i + 1) + "]" : "trak";
-        KVAtomBox const* const samples = tracks[i]->findFirstChild(true, KVAtomType("stbl"));
-        if (!samples)
-            continue;
-        for (bool const wide : {false, true}) {
-            char const* const type = wide ? "co64" : "stco";
-            if (!samples->findFirstChild(false, wide ? KVAtomType("co64") : KVAtomType("stco")))
-                continue;
-            ChunkTable table{
-                "moov/" + name + "/mdia/minf/stbl/" + type, wide, isExternal(file, *tracks[i]), {}};
-            if (!readChunks(file, *samples, table))
-                throw badInput(path, table.path + ": the sample tables of this track contradict "
-                                                  "each other");
-            for (Chunk const& chunk : table.chunks)
-                if (!table.external &&
-                    (chunk.offset > file.getSize() || chunk.size > file.getSize() - chunk.offset))
-                    throw badInput(path, table.path + ": leads to offset " +
-                                             std::to_string(chunk.offset) +
-                                             ", where the file has no such bytes");
-            tables.push_back(std::move(table));
-        }
-    }
-    return tables;
-}
-
 [[noreturn]] void refuse(std::string const& path, std::string const& reason)
 {
     throw ToolError(ExitCode::Failed, path + ": " + reason + "; nothing was written");
@@ -273,10 +237,46 @@ std::vector<MovieAtom> fragmentsOf(std::string const& path)
 
 } // namespace
 
+std::vector<ChunkTable> readChunkTables(std::string const& path)
+{
+    KVAtomBoxFile file;
+    openMovie(file, path);
+    if (file.readAllTrackMediaAtomBoxes() != 0)
+        throw badInput(path, "has no moov atom, or more than one");
+    checkCoverage(file, path);
+    std::vector<ChunkTable> tables;
+    std::vector<KVAtomBox*> tracks;
+    file.findAllChildren(tracks, true, KVAtomType("trak"));
+    for (std::size_t i = 0; i < tracks.size(); ++i) {
+        std::string const name = tracks.size() > 1 ? "trak[" + std::to_string(i + 1) + "]" : "trak";
+        KVAtomBox const* const samples = tracks[i]->findFirstChild(true, KVAtomType("stbl"));
+        if (!samples)
+            continue;
+        for (bool const wide : {false, true}) {
+            char const* const type = wide ? "co64" : "stco";
+            if (!samples->findFirstChild(false, wide ? KVAtomType("co64") : KVAtomType("stco")))
+                continue;
+            ChunkTable table{
+                "moov/" + name + "/mdia/minf/stbl/" + type, wide, isExternal(file, *tracks[i]), {}};
+            if (!readChunks(file, *samples, table))
+                throw badInput(path, table.path + ": the sample tables of this track contradict "
+                                                  "each other");
+            for (Chunk const& chunk : table.chunks)
+                if (!table.external &&
+                    (chunk.offset > file.getSize() || chunk.size > file.getSize() - chunk.offset))
+                    throw badInput(path, table.path + ": leads to offset " +
+                                             std::to_string(chunk.offset) +
+                                             ", where the file has no such bytes");
+            tables.push_back(std::move(table));
+        }
+    }
+    return tables;
+}
+
 RewritePlan planRewrite(KVAtomBoxFile& file, std::string const& path)
 {
     RewritePlan plan;
-    plan.tables = readTables(path);
+    plan.tables = readChunkTables(path);
     plan.shift = file.getMediaDataShift();
     plan.after = planMovieTree(file);
     KVAtomBoxFile original;
@@ -312,7 +312,7 @@ std::uint64_t verifyRewrite(std::string const& original, std::string const& rewr
                                                   what + " are not the same; nothing was kept");
         compared += size;
     };
-    auto const oldTables = readTables(original), newTables = readTables(rewritten);
+    auto const oldTables = readChunkTables(original), newTables = readChunkTables(rewritten);
     bool const alike = std::equal(oldTables.begin(), oldTables.end(), newTables.begin(),
                                   newTables.end(), [](auto const& a, auto const& b) {
                                       return a.path == b.path && a.chunks.size() == b.chunks.size();

@@ -17,6 +17,10 @@ struct ChunkTable {
     std::vector<Chunk> chunks;
 };
 
+/// Every chunk offset table of a movie. Throws ToolError with code 3 when bytes of it are in no
+/// atom, or when its sample tables can not be read or lead out of it.
+std::vector<ChunkTable> readChunkTables(std::string const& path);
+
 /// What a rewrite of a changed movie would do.
 struct RewritePlan {
     std::vector<MovieAtom> before, after;
@@ -25,9 +29,8 @@ struct RewritePlan {
     long long shift = 0; ///< of every chunk offset
 };
 
-/// Plans the rewrite of `file`, whose tree holds the changes. Throws ToolError with code 3 when
-/// bytes of the input are in no atom and would be lost, or when its sample tables can not be read
-/// or lead out of it.
+/// Plans the rewrite of `file`, whose tree holds the changes. Throws as `readChunkTables` does:
+/// what is in no atom would be lost.
 RewritePlan planRewrite(KVAtomBoxFile& file, std::string const& path);
 
 /// Throws ToolError with code 1 when chunk offsets, or those of fragments, would be wrong

@@ -1,5 +1,6 @@
 #include "MovieTree.h"
 
+#include "FileBytes.h"
 #include "Input.h"
 #include "ToolError.h"
 
@@ -239,4 +240,28 @@ std::vector<AtomChange> compareMovieTrees(std::vector<MovieAtom> const& before,
     TreeComparer comparer(sameBytes);
     comparer.compare(before, after, "", 0);
     return std::move(comparer.changes);
+}
+
+MovieComparison compareMovies(std::string const& path, std::string const& against)
+{
+    MovieComparison result;
+    KVAtomBoxFile file;
+    openMovie(file, path);
+    result.length = file.getSize();
+    result.after = readMovieTree(file);
+    if (against.empty()) {
+        result.changes = compareMovieTrees(result.after, result.after,
+                                           [](auto const&, auto const&) { return true; });
+        return result;
+    }
+    KVAtomBoxFile other;
+    openMovie(other, against);
+    result.before = readMovieTree(other);
+    FileBytes const bytes(path), otherBytes(against);
+    result.changes =
+        compareMovieTrees(result.before, result.after, [&](MovieAtom const& a, MovieAtom const& b) {
+            return a.header == b.header && FileBytes::same(otherBytes, a.offset + a.header, bytes,
+                                                           b.offset + b.header, b.size - b.header);
+        });
+    return result;
 }

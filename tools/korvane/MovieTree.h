@@ -51,3 +51,14 @@ using SameBytes = std::function<bool(MovieAtom const& before, MovieAtom const& a
 std::vector<AtomChange> compareMovieTrees(std::vector<MovieAtom> const& before,
                                           std::vector<MovieAtom> const& after,
                                           SameBytes const& sameBytes);
+
+/// The trees of a file and of the one that it is compared with, and what became of each atom.
+struct MovieComparison {
+    std::uint64_t length = 0; ///< of the file, in bytes
+    std::vector<MovieAtom> before, after;
+    std::vector<AtomChange> changes; ///< they point into the trees
+};
+
+/// Reads `path` and compares it with `against`; where that is empty every atom is the same. Throws
+/// as `openMovie` does, and with code 4 for bytes that can not be read.
+MovieComparison compareMovies(std::string const& path, std::string const& against);

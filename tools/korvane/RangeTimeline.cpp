@@ -1,5 +1,8 @@
 #include "RangeTimeline.h"
 
+#include "Lanes.h"
+#include "Markup.h"
+
 #include <korvane/foundation/KVString.h>
 #include <korvane/time/VexTimeRangeAndObject.h>
 
@@ -71,14 +74,15 @@ std::vector<std::vector<Bar>> rowsOf(TimelineSet const& set, Scale const& scale,
     std::stable_sort(bars.begin(), bars.end(), [](Bar const& a, Bar const& b) {
         return CMTimeCompare(a.range->start(), b.range->start()) < 0;
     });
+    std::vector<Span> spans;
+    spans.reserve(bars.size());
+    for (Bar const& bar : bars)
+        spans.push_back({static_cast<double>(bar.from), static_cast<double>(bar.to)});
+    std::vector<std::size_t> const lanes = lanesOf(spans);
     std::vector<std::vector<Bar>> rows(1);
-    for (Bar const& bar : bars) {
-        auto free = std::find_if(rows.begin(), rows.end(), [&](std::vector<Bar> const& row) {
-            return row.empty() || row.back().to <= bar.from;
-        });
-        if (free == rows.end())
-            free = rows.emplace(free);
-        free->push_back(bar);
+    for (std::size_t i = 0; i < bars.size(); ++i) {
+        rows.resize(std::max(rows.size(), lanes[i] + 1));
+        rows[lanes[i]].push_back(bars[i]);
     }
     return rows;
 }
@@ -95,22 +99,6 @@ std::string barText(Bar const& bar)
     std::string text = "[" + (isPlain ? name : "");
     text.resize(width - 1, '=');
     return text + ")";
-}
-
-std::string escaped(std::string const& text)
-{
-    std::string result;
-    for (char const c : text) {
-        if (c == '&')
-            result += "&amp;";
-        else if (c == '<')
-            result += "&lt;";
-        else if (c == '"')
-            result += "&quot;";
-        else
-            result += static_cast<unsigned char>(c) < ' ' ? ' ' : c;
-    }
-    return result;
 }
 
 std::string secondsText(double seconds)

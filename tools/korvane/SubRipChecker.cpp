@@ -622,3 +622,18 @@ std::string repairedSubRip(std::vector<SubRipCaption> const& captions)
     }
     return file;
 }
+
+std::string withoutTags(std::string const& text)
+{
+    auto const importer = KVMakeRef<KVSRTCaptionsImporter>();
+    std::string plain;
+    for (KVString const& token : importer->_tokenizeString(text, importer->tagBeginningCharacters(),
+                                                           importer->tagEndingCharacters())) {
+        int const kind = importer->_tagFromToken(token);
+        if (kind == KVSRTCaptionsImporter::notATag)
+            plain += token.toUTF8();
+        else if (kind == KVSRTCaptionsImporter::lineBreak)
+            plain += '\n';
+    }
+    return plain;
+}

@@ -40,3 +40,6 @@ SubRipCheck checkSubRip(std::string_view bytes);
 
 /// The captions as a file that a strict reader takes: UTF-8, numbered from 1.
 std::string repairedSubRip(std::vector<SubRipCaption> const& captions);
+
+/// What of a caption's text is read: without its tags, "\n" between lines.
+std::string withoutTags(std::string const& text);

@@ -1,6 +1,9 @@
 #include "TimeForms.h"
 
+#include <korvane/captions/KVSRTCaptionsExporter.h>
 #include <korvane/time/KVTime.h>
+
+#include <cmath>
 
 std::string timeFraction(CMTime const& time)
 {
@@ -17,4 +20,9 @@ Json timeJson(CMTime const& time)
             {"timescale", time.timescale},
             {"seconds", CMTimeGetSeconds(time)},
             {"rounded", CMTimeIsRounded(time)}};
+}
+
+std::string timecodeText(double seconds)
+{
+    return (seconds < 0 ? "-" : "") + KVTimecodeStringFromTimeInSeconds(std::abs(seconds)).toUTF8();
 }

@@ -12,3 +12,6 @@ std::string timeFraction(CMTime const& time);
 
 /// { "value", "timescale", "seconds", "rounded" } of a number, else { "kind": "inf" }.
 Json timeJson(CMTime const& time);
+
+/// "01:02:05,500", with a sign before zero; milliseconds are cut.
+std::string timecodeText(double seconds);

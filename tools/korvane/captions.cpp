@@ -4,6 +4,7 @@
 #include "Input.h"
 #include "Json.h"
 #include "SubRipChecker.h"
+#include "TimeForms.h"
 #include "ToolError.h"
 #include "commands.h"
 
@@ -11,7 +12,6 @@
 
 #include <algorithm>
 #include <charconv>
-#include <cmath>
 #include <memory>
 #include <optional>
 
@@ -171,11 +171,6 @@ double endOf(KVCaption const* caption)
     return CMTimeGetSeconds(KV_CMTimeRangeEnd(caption->timeRange()));
 }
 
-std::string timecodeOf(double seconds)
-{
-    return (seconds < 0 ? "-" : "") + KVTimecodeStringFromTimeInSeconds(std::abs(seconds)).toUTF8();
-}
-
 /// A caption's text in one line, " / " for a line end.
 std::string inOneLine(std::string text)
 {
@@ -215,7 +210,7 @@ void show(ShowOptions const& options)
         }
         std::string const digits = std::to_string(number);
         table += std::string(digits.size() < 4 ? 4 - digits.size() : 0, ' ') + digits + "  " +
-                 timecodeOf(startOf(caption)) + "  " + timecodeOf(endOf(caption)) + "  " +
+                 timecodeText(startOf(caption)) + "  " + timecodeText(endOf(caption)) + "  " +
                  inOneLine(options.tags ? tagged : text) + "\n";
     }
     if (options.json)

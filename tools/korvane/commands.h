@@ -23,11 +23,12 @@ void addLutCommands(CLI::App& program);
 void addMatrixCommands(CLI::App& program);
 void addMediaCommands(CLI::App& program);
 void addRangesCommands(CLI::App& program);
+void addReportCommands(CLI::App& program);
 void addSceneCommands(CLI::App& program);
 void addTimeCommands(CLI::App& program);
 
 /// The families, in the order in which `korvane --help` lists them.
 inline constexpr AddCommands commandFamilies[] = {
-    addSceneCommands,  addTimeCommands, addRangesCommands, addCaptionsCommands,
-    addMatrixCommands, addLutCommands,  addBlendCommands,  addMediaCommands,
+    addSceneCommands, addTimeCommands,  addRangesCommands, addCaptionsCommands, addMatrixCommands,
+    addLutCommands,   addBlendCommands, addMediaCommands,  addReportCommands,
 };

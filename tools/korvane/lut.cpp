@@ -1,13 +1,11 @@
 #include "Input.h"
 #include "Json.h"
-#include "LutDiagnosis.h"
+#include "LutFile.h"
 #include "LutLookup.h"
 #include "LutPlot.h"
 #include "Numbers.h"
 #include "ToolError.h"
 #include "commands.h"
-
-#include <korvane/colour/multilut_t.h>
 
 #include <algorithm>
 #include <cctype>
@@ -20,95 +18,9 @@
 #include <sstream>
 
 #include <fcntl.h>
-#include <sys/mman.h>
 #include <unistd.h>
 
 namespace {
-
-// --- Reading ---
-
-/// A LUT file by a name that the library can open twice; standard input is kept in memory.
-class LutFile {
-public:
-    explicit LutFile(std::string const& path) : shown_(path), path_(path)
-    {
-        if (path != "-") {
-            checkReadable(path);
-            return;
-        }
-        std::string const bytes = readFile(path);
-        fd_ = ::memfd_create("korvane-lut", MFD_CLOEXEC);
-        std::string_view rest(bytes);
-        while (fd_ >= 0 && !rest.empty()) {
-            ssize_t const count = ::write(fd_, rest.data(), rest.size());
-            if (count < 0)
-                throw inputOutput(path, errno);
-            rest.remove_prefix(static_cast<std::size_t>(count));
-        }
-        if (fd_ < 0)
-            throw inputOutput(path, errno);
-        path_ = "/proc/self/fd/" + std::to_string(fd_);
-    }
-    LutFile(LutFile const&) = delete;
-    LutFile& operator=(LutFile const&) = delete;
-    ~LutFile()
-    {
-        if (fd_ >= 0)
-            ::close(fd_);
-    }
-
-    cc::lut_t read(unsigned long index) const
-    {
-        cc::lut_t lut;
-        if (int const code = lut.read(path_.c_str(), index))
-            throw refusal(code, lut.format(), index);
-        if (lut.table.empty())
-            throw badInput(shown_, "it has no table " + std::to_string(index));
-        return withoutBorrowedName(std::move(lut));
-    }
-    std::vector<cc::lut_t> readAll() const
-    {
-        cc::multilut_t luts;
-        int const code = luts.read(path_.c_str(), false);
-        unsigned long const index = luts.tables.size();
-        if (code != cc::kSuccess || index == 0) {
-            cc::lut_t lut; // which format it is decides what is wrong with it
-            unsigned int const format =
-                index == 0 ? (lut.read(path_.c_str(), 0), lut.format()) : luts.tables[0].format();
-            if (code == cc::kSuccess)
-                throw badInput(shown_, "it has no table");
-            throw refusal(code, format, index);
-        }
-        for (cc::lut_t& lut : luts.tables)
-            lut = withoutBorrowedName(std::move(lut));
-        return std::move(luts.tables);
-    }
-
-private:
-    ToolError refusal(int code, unsigned int format, unsigned long index) const
-    {
-        if (code == cc::kCannotOpen)
-            return inputOutput(shown_, "it cannot be opened or read twice");
-        LutFault const fault = diagnoseLut(path_, format, index);
-        return fault.line ? badInput(shown_, fault.line, fault.text) : badInput(shown_, fault.text);
-    }
-    /// The number of a descriptor is no title.
-    cc::lut_t withoutBorrowedName(cc::lut_t lut) const
-    {
-        if (fd_ >= 0) {
-            if (lut.title == lut.name)
-                lut.title.clear();
-            lut.name.clear();
-        }
-        return lut;
-    }
-
-    std::string shown_;
-    std::string path_;
-    int fd_ = -1;
-};
-
-// --- Numbers and names ---
 
 /// False for what is not one finite number and nothing else.
 bool parse(std::string_view word, float& value)
@@ -118,49 +30,14 @@ bool parse(std::string_view word, float& value)
     return error == std::errc() && end == word.data() + word.size() && std::isfinite(value);
 }
 
-char const* formatName(unsigned int format)
-{
-    return format == cc::lut_t::kMGA ? "Pandora 3D LUT (.mga)" : "Adobe Cube LUT (.cube)";
-}
-
-std::string sizeText(cc::lut_t const& lut)
-{
-    std::string const size = std::to_string(lut.size);
-    return lut.kind == cc::lut_t::k3D ? "3D, " + size + " x " + size + " x " + size
-                                      : "1D, " + size + " values";
-}
-
 // --- info ---
-
-/// The least and the greatest value of a channel, in the domain's scale.
-std::pair<float, float> rangeOf(cc::lut_t const& lut, std::size_t channel, std::size_t channels)
-{
-    unsigned short least = 65535;
-    unsigned short greatest = 0;
-    for (std::size_t i = channel; i < lut.table.size(); i += channels) {
-        least = std::min(least, lut.table[i]);
-        greatest = std::max(greatest, lut.table[i]);
-    }
-    auto const scaled = [&](unsigned short value) {
-        return static_cast<float>(value) / 65535.0f * (lut.domainMax - lut.domainMin) +
-               lut.domainMin;
-    };
-    return {scaled(least), scaled(greatest)};
-}
-
-std::vector<char const*> channelNames(cc::lut_t const& lut)
-{
-    if (lut.kind == cc::lut_t::k3D)
-        return {"red", "green", "blue"};
-    return {"all channels"};
-}
 
 Json describe(cc::lut_t const& lut)
 {
     Json values = Json::object();
     auto const channels = channelNames(lut);
     for (std::size_t i = 0; i < channels.size(); ++i) {
-        auto const [least, greatest] = rangeOf(lut, i, channels.size());
+        auto const [least, greatest] = rangeOf(lut, i);
         values[channels[i]] = {least, greatest};
     }
     return {{"format", lut.format() == cc::lut_t::kMGA ? "mga" : "cube"},
@@ -173,7 +50,7 @@ Json describe(cc::lut_t const& lut)
 
 void info(std::string const& path, bool json)
 {
-    std::vector<cc::lut_t> const luts = LutFile(path).readAll();
+    std::vector<cc::lut_t> const luts = readLuts(ReopenableFile(path));
     Json tables = Json::array();
     std::string text;
     for (std::size_t index = 0; index < luts.size(); ++index) {
@@ -188,7 +65,7 @@ void info(std::string const& path, bool json)
         text += "domain  " + shortest(lut.domainMin) + " to " + shortest(lut.domainMax) + "\n";
         auto const channels = channelNames(lut);
         for (std::size_t i = 0; i < channels.size(); ++i) {
-            auto const [least, greatest] = rangeOf(lut, i, channels.size());
+            auto const [least, greatest] = rangeOf(lut, i);
             text += "values  " + shortest(least) + " to " + shortest(greatest) + " in " +
                     channels[i] + "\n";
         }
@@ -252,7 +129,7 @@ struct ConvertOptions {
 void convert(ConvertOptions const& options)
 {
     unsigned int const format = options.format ? options.format : formatFor(options.out);
-    cc::lut_t lut = LutFile(options.in).read(options.index);
+    cc::lut_t lut = readLut(ReopenableFile(options.in), options.index);
     // Neither format has a form for curves: one becomes a cube.
     int const size = options.size ? options.size : lut.kind == cc::lut_t::k1D ? 33 : lut.size;
     if (lut.kind == cc::lut_t::k1D || size != lut.size) {
@@ -323,7 +200,7 @@ void apply(std::string const& path, unsigned long index, Interpolation interpola
     if (words.empty() && path == "-")
         throw ToolError(ExitCode::Usage, "the table and the colours cannot both come from "
                                          "standard input");
-    cc::lut_t const lut = LutFile(path).read(index);
+    cc::lut_t const lut = readLut(ReopenableFile(path), index);
     auto const lookup = makeLookup(lut, interpolation);
     if (words.empty())
         applyToInput(*lookup);
@@ -335,7 +212,7 @@ void apply(std::string const& path, unsigned long index, Interpolation interpola
 
 void plot(std::string const& path, std::string const& out, unsigned long index, float slice)
 {
-    cc::lut_t const lut = LutFile(path).read(index);
+    cc::lut_t const lut = readLut(ReopenableFile(path), index);
     std::string const svg = plotLut(lut, *makeLookup(lut, Interpolation::Tetrahedral), slice);
     AtomicOutput output(out);
     output.write(svg);

@@ -1,24 +1,18 @@
 #include "Input.h"
 #include "Json.h"
+#include "MatrixText.h"
 #include "Numbers.h"
 #include "ToolError.h"
 #include "commands.h"
 
 #include <korvane/numerics/KVMatrix44Double.h>
 
-#include <algorithm>
-#include <charconv>
 #include <cmath>
 #include <memory>
 #include <numbers>
 #include <span>
 
 namespace {
-
-using Matrix = KVMatrix44Tmpl<double>;
-
-/// The order of the angles: about z, then x, then y, as extendedDescription tells them.
-constexpr int rotationOrder = 4;
 
 /// Sixteen numbers, row by row: each an argument, or all of them in the one file that is named.
 class MatrixArgument {
@@ -32,71 +26,11 @@ public:
     Matrix read() const
     {
         if (words_.size() == 1)
-            return readFrom(words_[0]);
-        Matrix matrix;
-        for (std::size_t i = 0; i < words_.size(); ++i)
-            if (std::string const fault = store(words_[i], i, matrix); !fault.empty())
-                throw ToolError(ExitCode::BadInput, fault);
-        if (std::string const fault = missing(words_.size()); !fault.empty())
-            throw ToolError(ExitCode::BadInput, fault);
-        return matrix;
+            return readMatrix(words_[0], readFile(words_[0]));
+        return matrixOf(words_);
     }
 
 private:
-    /// Numbers stand apart by blanks, line ends, commas, semicolons or brackets, so that a matrix
-    /// that was printed can be read again.
-    static Matrix readFrom(std::string const& path)
-    {
-        constexpr char separators[] = " \t\r\n,;()[]";
-        std::string const text = readFile(path);
-        Matrix matrix;
-        std::size_t count = 0;
-        unsigned long line = 1;
-        std::size_t end = 0;
-        for (;;) {
-            std::size_t const start =
-                std::min(text.find_first_not_of(separators, end), text.size());
-            line += static_cast<unsigned long>(
-                std::count(text.data() + end, text.data() + start, '\n'));
-            if (start == text.size())
-                break;
-            end = std::min(text.find_first_of(separators, start), text.size());
-            if (std::string const fault =
-                    store(std::string_view(text).substr(start, end - start), count++, matrix);
-                !fault.empty())
-                throw badInput(path, line, fault);
-        }
-        if (std::string const fault = missing(count); !fault.empty())
-            throw badInput(path, line, fault);
-        return matrix;
-    }
-
-    /// Stores the number that has `index` others before it; else says what is wrong with it.
-    static std::string store(std::string_view word, std::size_t index, Matrix& matrix)
-    {
-        std::string const which = "number " + std::to_string(index + 1);
-        std::string const shown = " \"" + std::string(word.substr(0, 40)) + "\" ";
-        if (index > 15)
-            return which + shown + "is one too many: a matrix has sixteen";
-        std::string_view const digits = word.substr(word.starts_with('+') ? 1 : 0);
-        double value = 0;
-        auto const [end, error] =
-            std::from_chars(digits.data(), digits.data() + digits.size(), value);
-        if (error == std::errc::invalid_argument || end != digits.data() + digits.size())
-            return which + shown + "is not a number";
-        if (error != std::errc() || !std::isfinite(value))
-            return which + shown + "is out of range";
-        matrix.data()[index] = value;
-        return {};
-    }
-    static std::string missing(std::size_t count)
-    {
-        if (count >= 16)
-            return {};
-        return "number " + std::to_string(count + 1) +
-               " is missing: a matrix has sixteen, here are " + std::to_string(count);
-    }
-
     std::vector<std::string> words_;
 };
 

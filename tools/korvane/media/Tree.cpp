@@ -1,7 +1,5 @@
 // korvane media tree: the atoms of a movie.
 
-#include "../FileBytes.h"
-#include "../Input.h"
 #include "../Json.h"
 #include "../MovieTree.h"
 #include "Commands.h"
@@ -43,39 +41,22 @@ Json atomsAsJson(std::vector<AtomChange> const& changes, std::size_t& next, int 
 
 void tree(TreeOptions const& options)
 {
-    KVAtomBoxFile file;
-    openMovie(file, options.file);
-    std::uint64_t const length = file.getSize();
-    std::vector<MovieAtom> const atoms = readMovieTree(file);
-    std::uint64_t const end = atoms.back().offset + atoms.back().size;
-
+    MovieComparison const movie = compareMovies(options.file, options.against);
+    std::uint64_t const length = movie.length;
+    std::uint64_t const end = movie.after.back().offset + movie.after.back().size;
     bool const marked = !options.against.empty();
-    std::vector<MovieAtom> other;
-    std::vector<AtomChange> changes;
-    if (marked) {
-        KVAtomBoxFile otherFile;
-        openMovie(otherFile, options.against);
-        other = readMovieTree(otherFile);
-        FileBytes const bytes(options.file), otherBytes(options.against);
-        changes = compareMovieTrees(other, atoms, [&](MovieAtom const& a, MovieAtom const& b) {
-            return a.header == b.header && FileBytes::same(otherBytes, a.offset + a.header, bytes,
-                                                           b.offset + b.header, b.size - b.header);
-        });
-    } else {
-        changes = compareMovieTrees(atoms, atoms, [](auto&, auto&) { return true; });
-    }
 
     if (options.json) {
         std::size_t next = 0;
         Json document = {{"file", options.file},
                          {"size", length},
-                         {"atoms", atomsAsJson(changes, next, 0, marked)}};
+                         {"atoms", atomsAsJson(movie.changes, next, 0, marked)}};
         if (end != length)
             document["unread_from"] = end;
         return printJson(document);
     }
     std::string text = padded("offset", 12) + padded("size", 13) + "  atom\n";
-    for (AtomChange const& change : changes) {
+    for (AtomChange const& change : movie.changes) {
         MovieAtom const& atom = change.after ? *change.after : *change.before;
         text += padded(std::to_string(atom.offset), 12) + padded(std::to_string(atom.size), 13);
         text += marked ? std::string(" ") + AtomChange::marks[change.kind] + " " : "  ";
