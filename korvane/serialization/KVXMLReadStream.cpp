@@ -359,7 +359,8 @@ void KVXMLReadStream::addAttributes(KVXMLStreamElement& element)
     };
     for (xmlNs const* space = node->nsDef; space; space = space->next) {
         char const* const value = space->href ? chars(space->href) : "";
-        xmlChar const* const xmlns = xmlDictLookup(node->doc->dict, BAD_CAST "xmlns", 5);
+        xmlChar const* const xmlns =
+            xmlDictLookup(node->doc->dict, reinterpret_cast<xmlChar const*>("xmlns"), 5);
         if (space->prefix)
             add(xmlns, space->prefix, value);
         else

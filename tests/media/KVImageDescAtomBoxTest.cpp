@@ -300,3 +300,12 @@ TEST(KVImageDescAtomBox, QuickTimeDescriptionsEndInFourZeros)
     EXPECT_EQ(tree(descriptions), "0(avc1(stsd pasp 0))") << "not twice";
     EXPECT_EQ(descriptions.getTopAtomBox().getSize(), 86u + 16u + 4u);
 }
+
+TEST(KVImageDescAtomBox, AnExtensionToTheEndGetsItsSizeWhenAnotherFollows)
+{
+    std::string const toTheEnd = be32(0) + kPasp.substr(4);
+    KVImageDescAtomBox descriptions = parse(videoDescription(toTheEnd));
+    EXPECT_EQ(full(descriptions), videoDescription(toTheEnd));
+    descriptions.setImageDescFieldInfo(0, 1, 6);
+    EXPECT_EQ(full(descriptions), videoDescription(kPasp + atom("fiel", "\1\6")));
+}
