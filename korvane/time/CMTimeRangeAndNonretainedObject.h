@@ -7,8 +7,6 @@
 /// A range of time beside an object that somebody else keeps alive.
 class KV_EXPORT CMTimeRangeAndNonretainedObject : public NSObject, public NSCoding {
 public:
-    static NSCodingClass const coding;
-
     /// Does not retain: `object` must outlive all use of it through this.
     CMTimeRangeAndNonretainedObject(CMTimeRange const& range, NSObject const* object) noexcept
         : range_(range), object_(object)
@@ -19,8 +17,11 @@ public:
     CMTimeRange range() const noexcept { return range_; }
     NSObject const* object() const noexcept { return object_; }
 
+    // --- Archive: key "range"; see KVTimeCoding.h ---
+
+    static NSCodingClass const coding;
     NSCodingClass const& codingClass() const override { return coding; }
-    /// The range alone: nobody would own the object that was read back. It is null then.
+    /// The range alone, as nobody would own an object that was read back; `object` is null then.
     void encodeWithCoder(NSCoder& coder) const override;
     static KVNSRef<NSObject*> initWithCoder(NSCoder& coder);
 

@@ -389,6 +389,16 @@ CMTime KV_CMTimeGetPreferredSampleDurationAlias(CMTime duration) noexcept
     return duration;
 }
 
+double VexTimeToRealFrameWithRate(CMTime const& time, double rate) noexcept
+{
+    return CMTimeGetSeconds(time) * rate;
+}
+
+std::int64_t VexTimeToFrameWithRate(CMTime const& time, double rate) noexcept
+{
+    return kv::saturated(std::floor(VexTimeToRealFrameWithRate(time, rate) + 1e-7));
+}
+
 // --- From seconds ---
 
 CMTime KV_CMTimeMakeWithSecondsRoundToNearest(double seconds, CMTimeScale timescale) noexcept

@@ -12,8 +12,8 @@
 //     CMTime frame = CMTimeMake(1001, 30000);
 //     CMTime reel = KV_CMTimeFromSampleNumberAndDuration(30000, frame);   // 1001 seconds, exactly
 //     CMTime cut = KV_CMTimeFloorToSampleDuration(CMTimeMake(352, 100), frame);   // 105105/30000
-//     if (CMTimeIsRounded(reel * CMTimeMake(1, 3)))
-//         ...                                        // the result is the nearest that there is
+//     if (CMTimeIsRounded(frame * CMTimeMake(1, 1000000007)))
+//         ...                                        // it is: no CMTime holds the exact product
 //
 // What cannot be calculated is kCMTimeInvalid or an infinity, what is approximate carries the
 // rounded bit; nothing throws, traps or allocates (those that make text excepted). Where
@@ -41,15 +41,20 @@ KV_EXPORT CMTime KV_CMTimeHalve(CMTime time) noexcept;
 /// Reduces a number to lowest terms, in place; false if it was, or is not a number.
 KV_EXPORT bool SimpCMTime(CMTime* time) noexcept;
 
+/// The product of the two in seconds, itself as a time in seconds: `KV_CMTimeMultiply64Divide64` by
+/// the value and the timescale of `b`. Its flags do not count, so a mark of rounding that only `b`
+/// has is lost, and an infinity, whose timescale is 0, gives invalid.
 KV_EXPORT CMTime operator*(CMTime const& a, CMTime const& b) noexcept;
+/// `CMTimeMultiplyByFloat64`, and `CMTimeMultiply` for integers.
 KV_EXPORT CMTime operator*(CMTime const& time, double factor) noexcept;
 KV_EXPORT CMTime operator*(double factor, CMTime const& time) noexcept;
 KV_EXPORT CMTime operator*(CMTime const& time, int factor) noexcept;
 KV_EXPORT CMTime operator*(int factor, CMTime const& time) noexcept;
 KV_EXPORT CMTime operator*(CMTime const& time, unsigned int factor) noexcept;
 KV_EXPORT CMTime operator*(unsigned int factor, CMTime const& time) noexcept;
-/// The quotient of two times, itself as a time in seconds.
+/// The quotient of two times, itself as a time in seconds, by the same rules.
 KV_EXPORT CMTime operator/(CMTime const& a, CMTime const& b) noexcept;
+/// `KV_CMTimeMultiply64Divide64`: a divisor of 0 gives invalid.
 KV_EXPORT CMTime operator/(CMTime const& time, int divisor) noexcept;
 KV_EXPORT CMTime operator/(CMTime const& time, unsigned int divisor) noexcept;
 /// Divides by a fraction near `divisor`, over the first of the timescale, its double, and so on to
@@ -100,6 +105,12 @@ KV_EXPORT CMTime KV_CMTimeRemap(CMTime time, CMTime oldDuration, CMTime newDurat
 /// other duration comes back as it is.
 KV_EXPORT CMTime KV_CMTimeGetPreferredSampleDurationAlias(CMTime duration) noexcept;
 
+/// Seconds times `rate`, in frames per second.
+KV_EXPORT double VexTimeToRealFrameWithRate(CMTime const& time, double rate) noexcept;
+/// The whole frame that this lies in, negative times too; what lies within 1e-7 frames before a
+/// frame counts to it. Out of range the nearest end, NaN 0.
+KV_EXPORT std::int64_t VexTimeToFrameWithRate(CMTime const& time, double rate) noexcept;
+
 // --- From seconds ---
 
 /// The nearest tick, half way the later one. It carries the rounded bit unless half a tick later is
@@ -118,6 +129,10 @@ KV_EXPORT KVString KV_CMTimeToString(CMTime time);
 /// With the fraction: "3.520000(352/100)", "3.520000(352/100+epoch=2+round)"; what is not a number
 /// and has no value is written as above.
 KV_EXPORT KVString KV_CMTimeToFractionString(CMTime time);
+
+/// The sample number, for logs: "105". Both are the same.
+KV_EXPORT KVString VexTimeCopySampleString(CMTime time, CMTime sampleDuration);
+KV_EXPORT KVString VexTimeToSampleString(CMTime time, CMTime sampleDuration);
 
 /// The seconds in the stream's own number format, "+epoch=" and the epoch unless it is 0, "+round"
 /// if rounded; "inval", "indef". A stream that has been given a timescale prints numbers on that

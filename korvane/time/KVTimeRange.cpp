@@ -1,12 +1,6 @@
 #include <korvane/time/KVTimeRange.h>
 
-#include <korvane/foundation/KVNSRef.h>
-#include <korvane/platform/CFNumber.h>
-#include <korvane/platform/Int128_p.h>
 #include <korvane/time/KVTime.h>
-
-#include <cmath>
-#include <optional>
 
 namespace {
 
@@ -109,6 +103,16 @@ KVString KV_CMTimeRangeToString(CMTimeRange const& range)
     return text;
 }
 
+KVString VexTimeRangeToSampleString(CMTimeRange const& range, CMTime sampleDuration)
+{
+    KVString text("[");
+    text.append(VexTimeToSampleString(range.start, sampleDuration));
+    text.append(",");
+    text.append(VexTimeToSampleString(KV_CMTimeRangeEnd(range), sampleDuration));
+    text.append(")");
+    return text;
+}
+
 // --- Pairs ---
 
 KVCMTimePair VexTimePairMakeByAddingOffset(KVCMTimePair const& pair, CMTime offset) noexcept
@@ -119,108 +123,4 @@ KVCMTimePair VexTimePairMakeByAddingOffset(KVCMTimePair const& pair, CMTime offs
 CMTime VexTimePairSecondMinusFirst(KVCMTimePair const& pair) noexcept
 {
     return KV_CMTimeSaferSubtract(pair.second, pair.first);
-}
-
-// --- Frame numbers ---
-
-namespace {
-
-long long sample(CMTime time, CMTime sampleDuration) noexcept
-{
-    return KV_CMTimeGetSampleNumber(time, sampleDuration);
-}
-
-} // namespace
-
-KVString VexTimeToSampleString(CMTime time, CMTime sampleDuration)
-{
-    return KVString::ssprintf("%lld", sample(time, sampleDuration));
-}
-
-KVString VexTimeCopySampleString(CMTime time, CMTime sampleDuration)
-{
-    return VexTimeToSampleString(time, sampleDuration);
-}
-
-KVString VexTimeRangeToSampleString(CMTimeRange const& range, CMTime sampleDuration)
-{
-    return KVString::ssprintf("[%lld,%lld)", sample(range.start, sampleDuration),
-                              sample(KV_CMTimeRangeEnd(range), sampleDuration));
-}
-
-double VexTimeToRealFrameWithRate(CMTime const& time, double rate) noexcept
-{
-    return CMTimeGetSeconds(time) * rate;
-}
-
-std::int64_t VexTimeToFrameWithRate(CMTime const& time, double rate) noexcept
-{
-    return kv::saturated(std::floor(VexTimeToRealFrameWithRate(time, rate) + 1e-7));
-}
-
-// --- Dictionaries ---
-
-namespace {
-
-using Dictionary = KVCFRef<CFMutableDictionaryRef>;
-
-Dictionary makeDictionary()
-{
-    return Dictionary::adopt(CFDictionaryCreateMutable(kCFAllocatorDefault, 0));
-}
-
-void setNumber(CFMutableDictionaryRef dictionary, std::string_view key, std::int64_t number)
-{
-    auto const boxed = KVMakeRef<NSNumber>(static_cast<long long>(number));
-    dictionary->setValue(key, boxed);
-}
-
-std::optional<std::int64_t> numberOf(CFDictionaryRef dictionary, std::string_view key) noexcept
-{
-    auto const* number = dynamic_cast<NSNumber const*>(dictionary->value(key));
-    return number ? std::optional(number->int64Value()) : std::nullopt;
-}
-
-} // namespace
-
-KVCFRef<CFDictionaryRef> CMTimeCopyAsDictionary(CMTime const& time)
-{
-    Dictionary const dictionary = makeDictionary();
-    setNumber(dictionary, "value", time.value);
-    setNumber(dictionary, "timescale", time.timescale);
-    setNumber(dictionary, "flags", time.flags);
-    setNumber(dictionary, "epoch", time.epoch);
-    return dictionary;
-}
-
-CMTime CMTimeMakeFromDictionary(CFDictionaryRef dictionary) noexcept
-{
-    if (!dictionary)
-        return kCMTimeInvalid;
-    auto const value = numberOf(dictionary, "value"), timescale = numberOf(dictionary, "timescale");
-    auto const flags = numberOf(dictionary, "flags"), epoch = numberOf(dictionary, "epoch");
-    if (!value || !timescale || !flags || !epoch || *timescale < INT32_MIN ||
-        *timescale > INT32_MAX || *flags < 0 || *flags > UINT32_MAX)
-        return kCMTimeInvalid;
-    return {*value, static_cast<CMTimeScale>(*timescale), static_cast<std::uint32_t>(*flags),
-            *epoch};
-}
-
-KVCFRef<CFDictionaryRef> CMTimeRangeCopyAsDictionary(CMTimeRange const& range)
-{
-    Dictionary const dictionary = makeDictionary();
-    dictionary->setValue("start", CMTimeCopyAsDictionary(range.start));
-    dictionary->setValue("duration", CMTimeCopyAsDictionary(range.duration));
-    return dictionary;
-}
-
-CMTimeRange CMTimeRangeMakeFromDictionary(CFDictionaryRef dictionary) noexcept
-{
-    auto const time = [&](std::string_view key) {
-        return dictionary
-                   ? CMTimeMakeFromDictionary(dynamic_cast<CFDictionaryRef>(dictionary->value(key)))
-                   : kCMTimeInvalid;
-    };
-    CMTime const duration = time("duration");
-    return {time("start"), KV_CMTimeIsNegative(duration) ? kCMTimeZero : duration};
 }

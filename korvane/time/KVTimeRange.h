@@ -1,8 +1,6 @@
 #pragma once
 
-#include <korvane/foundation/KVCFRef.h>
 #include <korvane/foundation/KVString.h>
-#include <korvane/platform/CFDictionary.h>
 #include <korvane/platform/CMTimeRange.h>
 
 // Ranges of time: made, measured, moved and joined. Sets of ranges are in VexTimeRanges.h.
@@ -44,6 +42,7 @@ KV_EXPORT CMTimeRange KV_CMTimeRangeMakeWithStartEnd(CMTime start, CMTime end) n
 /// From its ends as they are: the duration may be negative or not numeric.
 KV_EXPORT CMTimeRange CMTimeRangeFromTimeToTime(CMTime start, CMTime end) noexcept;
 
+/// The range with its start moved by `offset`; the duration stays.
 KV_EXPORT CMTimeRange KV_CMTimeRangeMakeByAddingOffset(CMTimeRange const& range,
                                                        CMTime offset) noexcept;
 KV_EXPORT CMTimeRange KV_CMTimeRangeMakeBySubtractingOffset(CMTimeRange const& range,
@@ -63,6 +62,8 @@ KV_EXPORT CMTimeRange VexTimeRangeAdjustToBeWithinRangeWithMinimumDuration(
 KV_EXPORT CMTime KV_CMTimeRangeEnd(CMTimeRange const& range) noexcept;
 /// "[start, end)", each as KV_CMTimeToString has it.
 KV_EXPORT KVString KV_CMTimeRangeToString(CMTimeRange const& range);
+/// Its ends as sample numbers, for logs: "[105,211)".
+KV_EXPORT KVString VexTimeRangeToSampleString(CMTimeRange const& range, CMTime sampleDuration);
 
 // --- Pairs ---
 
@@ -79,28 +80,5 @@ constexpr KVCMTimePair VexTimePairMake(CMTime const& first, CMTime const& second
 /// Both moved by `offset`.
 KV_EXPORT KVCMTimePair VexTimePairMakeByAddingOffset(KVCMTimePair const& pair,
                                                      CMTime offset) noexcept;
+/// How far the second lies behind the first; negative where it lies before it.
 KV_EXPORT CMTime VexTimePairSecondMinusFirst(KVCMTimePair const& pair) noexcept;
-
-// --- Frame numbers ---
-
-/// Sample numbers for logs: "105", "[105,211)".
-KV_EXPORT KVString VexTimeCopySampleString(CMTime time, CMTime sampleDuration);
-KV_EXPORT KVString VexTimeToSampleString(CMTime time, CMTime sampleDuration);
-KV_EXPORT KVString VexTimeRangeToSampleString(CMTimeRange const& range, CMTime sampleDuration);
-
-/// Seconds times `rate`, in frames per second.
-KV_EXPORT double VexTimeToRealFrameWithRate(CMTime const& time, double rate) noexcept;
-/// The whole frame that this lies in, negative times too; what lies within 1e-7 before a frame
-/// counts to it. Out of range the nearest end, NaN 0.
-KV_EXPORT std::int64_t VexTimeToFrameWithRate(CMTime const& time, double rate) noexcept;
-
-// --- Dictionaries ---
-
-/// { "value", "timescale", "flags", "epoch" }, each a number.
-KV_EXPORT KVCFRef<CFDictionaryRef> CMTimeCopyAsDictionary(CMTime const& time);
-/// Invalid for null, and when a number is missing or does not fit its field.
-KV_EXPORT CMTime CMTimeMakeFromDictionary(CFDictionaryRef dictionary) noexcept;
-/// { "start", "duration" }, each a dictionary.
-KV_EXPORT KVCFRef<CFDictionaryRef> CMTimeRangeCopyAsDictionary(CMTimeRange const& range);
-/// Each time that is missing or bad is invalid; a negative duration becomes 0.
-KV_EXPORT CMTimeRange CMTimeRangeMakeFromDictionary(CFDictionaryRef dictionary) noexcept;

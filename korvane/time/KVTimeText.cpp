@@ -96,6 +96,17 @@ KVString KV_CMTimeToFractionString(CMTime time)
     return KVString::fromUTF8(kv::fractionText(time).view());
 }
 
+KVString VexTimeToSampleString(CMTime time, CMTime sampleDuration)
+{
+    kv::TimeText text;
+    return KVString::fromUTF8((text << KV_CMTimeGetSampleNumber(time, sampleDuration)).view());
+}
+
+KVString VexTimeCopySampleString(CMTime time, CMTime sampleDuration)
+{
+    return VexTimeToSampleString(time, sampleDuration);
+}
+
 int getPreferredTimeScaleIndex()
 {
     static int const index = std::ios_base::xalloc();

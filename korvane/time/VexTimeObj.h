@@ -4,11 +4,12 @@
 #include <korvane/platform/CMTime.h>
 #include <korvane/platform/NSCoder.h>
 
-/// A time as an object, to be kept in arrays and archives.
+/// A time as an object, to be kept in arrays and archives. Immutable.
+///
+///     auto const cut = KVMakeRef<VexTimeObj>(CMTimeMake(1001, 24000));
+///     cut->compareWithTime(kCMTimeZero);      // kCFCompareGreaterThan
 class KV_EXPORT VexTimeObj : public NSObject, public NSCoding {
 public:
-    static NSCodingClass const coding;
-
     explicit VexTimeObj(CMTime const& time) noexcept : time_(time) {}
     static KVNSRef<VexTimeObj*> timeWithTime(CMTime const& time);
     static KVNSRef<VexTimeObj*> initWithCMTime(CMTime const& time);
@@ -28,6 +29,9 @@ public:
     /// As `KV_CMTimeToString` has it.
     KVString description() const override;
 
+    // --- Archive: key "time"; see KVTimeCoding.h ---
+
+    static NSCodingClass const coding;
     NSCodingClass const& codingClass() const override { return coding; }
     void encodeWithCoder(NSCoder& coder) const override;
     static KVNSRef<NSObject*> initWithCoder(NSCoder& coder);

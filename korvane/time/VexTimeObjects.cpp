@@ -5,7 +5,6 @@
 #include <korvane/time/VexTimePairObj.h>
 #include <korvane/time/VexTimeRangeAndObject.h>
 
-#include <cstring>
 #include <typeinfo>
 
 namespace {
@@ -33,51 +32,7 @@ CFComparisonResult order(CMTime const& a, CMTime const& b) noexcept
     return static_cast<CFComparisonResult>(CMTimeCompare(a, b));
 }
 
-template <class Record>
-void encodeRecord(NSCoder& coder, Record const& record, std::string_view key)
-{
-    coder.encodeBytes(&record, sizeof record, key);
-}
-
-template <class Record>
-std::optional<Record> decodeRecord(NSCoder& coder, std::string_view key)
-{
-    auto const bytes = coder.decodeBytes(key);
-    Record record;
-    if (!bytes || bytes->size() != sizeof record)
-        return std::nullopt;
-    std::memcpy(&record, bytes->data(), sizeof record);
-    return record;
-}
-
 } // namespace
-
-// --- Coding ---
-
-static_assert(sizeof(CMTime) == 24 && sizeof(CMTimeRange) == 48);
-
-void KVEncodeCMTime(NSCoder& coder, CMTime const& time, std::string_view key)
-{
-    encodeRecord(coder, time, key);
-}
-
-std::optional<CMTime> KVDecodeCMTime(NSCoder& coder, std::string_view key)
-{
-    return decodeRecord<CMTime>(coder, key);
-}
-
-void KVEncodeCMTimeRange(NSCoder& coder, CMTimeRange const& range, std::string_view key)
-{
-    encodeRecord(coder, range, key);
-}
-
-std::optional<CMTimeRange> KVDecodeCMTimeRange(NSCoder& coder, std::string_view key)
-{
-    auto range = decodeRecord<CMTimeRange>(coder, key);
-    if (range && KV_CMTimeIsNegative(range->duration))
-        range->duration = kCMTimeZero;
-    return range;
-}
 
 // --- VexTimeObj ---
 

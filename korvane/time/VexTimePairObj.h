@@ -4,11 +4,9 @@
 #include <korvane/platform/NSCoder.h>
 #include <korvane/time/KVTimeRange.h>
 
-/// Two times as one object.
+/// Two times as one object. Treat one as immutable once it is shared, though there are setters.
 class KV_EXPORT VexTimePairObj : public NSObject, public NSCoding {
 public:
-    static NSCodingClass const coding;
-
     VexTimePairObj(CMTime const& first, CMTime const& second) noexcept : pair_{first, second} {}
     explicit VexTimePairObj(KVCMTimePair const& pair) noexcept : pair_(pair) {}
     static KVNSRef<VexTimePairObj*> pairWithPair(KVCMTimePair const& pair);
@@ -29,6 +27,9 @@ public:
     KVString description() const override;
     NSObject* newCopy() const override;
 
+    // --- Archive: keys "first" and "second"; see KVTimeCoding.h ---
+
+    static NSCodingClass const coding;
     NSCodingClass const& codingClass() const override { return coding; }
     void encodeWithCoder(NSCoder& coder) const override;
     static KVNSRef<NSObject*> initWithCoder(NSCoder& coder);

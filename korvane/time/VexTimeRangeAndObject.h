@@ -9,8 +9,6 @@
 ///     auto pieces = VexTimeRangeObjSubtractSortedRanges(used, gaps);   // each still with its clip
 class KV_EXPORT VexTimeRangeAndObject : public VexTimeRangeObj {
 public:
-    static NSCodingClass const coding;
-
     /// Retains the object, which may be null.
     VexTimeRangeAndObject(CMTimeRange const& range, NSObject const* object)
         : VexTimeRangeObj(range), object_(object)
@@ -26,16 +24,20 @@ public:
     NSObject const* object() const noexcept { return object_; }
     /// The same object, by the name that tools ask for.
     NSObject const* representedToolObject() const noexcept { return object_; }
+    /// New objects with the start and the duration.
     KVNSRef<VexTimeObj*> startTimeObject() const;
     KVNSRef<VexTimeObj*> durationObject() const;
 
     /// An object of the same class with an equal range and an equal object.
     bool isEqual(NSObject const* other) const override;
-    /// The range, a blank, and the object's own description.
+    /// The range, a blank, and the object's own description, "(null)" for none.
     KVString description() const override;
 
     KVNSRef<VexTimeRangeObj*> copyWithRange(CMTimeRange const& range) const override;
 
+    // --- Archive: adds the key "object" ---
+
+    static NSCodingClass const coding;
     NSCodingClass const& codingClass() const override { return coding; }
     void encodeWithCoder(NSCoder& coder) const override;
     /// The object is read back if it is a string, number, data, array, NSNull or one of the time

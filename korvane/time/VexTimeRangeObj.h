@@ -21,8 +21,6 @@ public:
 /// Treat one as immutable once it is in an array, though there are setters: others may share it.
 class KV_EXPORT VexTimeRangeObj : public VexTimeRangeOperationCopying, public NSCoding {
 public:
-    static NSCodingClass const coding;
-
     explicit VexTimeRangeObj(CMTimeRange const& range) noexcept : range_(range) {}
     static KVNSRef<VexTimeRangeObj*> rangeWithRange(CMTimeRange const& range);
     static KVNSRef<VexTimeRangeObj*> initWithCMTimeRange(CMTimeRange const& range);
@@ -56,6 +54,9 @@ public:
 
     KVNSRef<VexTimeRangeObj*> copyWithRange(CMTimeRange const& range) const override;
 
+    // --- Archive: key "range"; see KVTimeCoding.h ---
+
+    static NSCodingClass const coding;
     NSCodingClass const& codingClass() const override { return coding; }
     void encodeWithCoder(NSCoder& coder) const override;
     static KVNSRef<NSObject*> initWithCoder(NSCoder& coder);

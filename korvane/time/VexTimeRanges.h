@@ -23,7 +23,10 @@
 //
 // Adding and subtracting unsorted ranges, and collapsing, take O((n + m) log(n + m)) steps for n
 // elements and m ranges whose numeric times can be written on one timescale, the least common
-// multiple of all, in 62 bits and in epoch 0. Other times are compared one by one, in O(n m).
+// multiple of all, which is at most 2147483647, in 62 bits and in epoch 0. Other times are compared
+// one by one, in O(n m).
+//
+// They may be called from any thread at once; an array that is being changed belongs to one.
 
 using VexTimeRangeArray = std::vector<KVNSRef<VexTimeRangeObj*>>;
 

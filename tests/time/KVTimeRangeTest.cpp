@@ -1,10 +1,5 @@
 #include "time/TimeTesting.h"
 
-#include <korvane/platform/CFNumber.h>
-#include <korvane/time/VexTimeRangeObj.h>
-
-#include <limits>
-
 using namespace timetest;
 
 namespace {
@@ -116,66 +111,4 @@ TEST(KVTimeRange, PrintsForLogs)
     EXPECT_EQ(text(VexTimeToSampleString(T(352, 100), frame)), "105");
     EXPECT_EQ(text(VexTimeCopySampleString(T(-352, 100), frame)), "-105");
     EXPECT_EQ(text(VexTimeRangeToSampleString({T(352, 100), T(352, 100)}, frame)), "[105,210)");
-}
-
-TEST(KVTimeRange, CountsFramesAtARate)
-{
-    EXPECT_EQ(VexTimeToRealFrameWithRate(T(1, 2), 25), 12.5);
-    struct Row {
-        CMTime time;
-        double rate;
-        std::int64_t frame;
-    } const rows[] = {
-        {T(1, 2), 25, 12},
-        {T(-1, 2), 25, -13},
-        {T(1001, 30000), 29.97002997002997, 1}, // a breath below frame 1
-        {T(99999, 100000), 1, 0},
-        {T(99999999, 100000000), 1, 1},
-        {forever, 25, highest},
-        {before, 25, lowest},
-        {invalid, 25, 0},
-        {T(1, 1), std::numeric_limits<double>::max(), highest},
-    };
-    for (Row const& row : rows)
-        EXPECT_EQ(VexTimeToFrameWithRate(row.time, row.rate), row.frame);
-}
-
-TEST(KVTimeRange, BecomesADictionary)
-{
-    CMTimeRange const range = {T(lowest, INT32_MIN, 0xFFFFFFFF, highest), T(5, 3, rounded)};
-    auto const dictionary = CMTimeRangeCopyAsDictionary(range);
-    EXPECT_EQ(CMTimeRangeMakeFromDictionary(dictionary), range);
-    auto const* start = dynamic_cast<CFDictionaryRef>(dictionary->value("start"));
-    ASSERT_TRUE(start);
-    for (char const* key : {"value", "timescale", "flags", "epoch"})
-        EXPECT_TRUE(start->value(key)) << key;
-
-    CMTimeRange const backward = {T(0, 1), T(-1, 1)};
-    EXPECT_EQ(CMTimeRangeMakeFromDictionary(CMTimeRangeCopyAsDictionary(backward)).duration,
-              kCMTimeZero);
-    EXPECT_EQ(CMTimeRangeMakeFromDictionary(nullptr), kCMTimeRangeInvalid);
-    EXPECT_EQ(CMTimeMakeFromDictionary(nullptr), kCMTimeInvalid);
-}
-
-TEST(KVTimeRange, RefusesADictionaryOfNoTime)
-{
-    auto const time = CMTimeCopyAsDictionary(T(1, 2));
-    struct Row {
-        char const* key;
-        KVNSRef<NSObject*> value;
-    } const rows[] = {
-        {"value", nullptr},
-        {"epoch", KVMakeRef<VexTimeRangeObj>(R(0, 1))},
-        {"timescale", KVMakeRef<NSNumber>(1ll << 31)},
-        {"timescale", KVMakeRef<NSNumber>(-(1ll << 31) - 1)},
-        {"flags", KVMakeRef<NSNumber>(1ll << 32)},
-        {"flags", KVMakeRef<NSNumber>(-1)},
-    };
-    for (Row const& row : rows) {
-        auto const changed =
-            KVCFRef<CFMutableDictionaryRef>::adopt(CFDictionaryCreateMutableCopy(nullptr, 0, time));
-        EXPECT_EQ(CMTimeMakeFromDictionary(changed), T(1, 2));
-        changed->setValue(row.key, row.value);
-        EXPECT_EQ(CMTimeMakeFromDictionary(changed), kCMTimeInvalid) << row.key;
-    }
 }

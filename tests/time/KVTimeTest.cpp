@@ -259,6 +259,28 @@ TEST(KVTime, CountsSamples)
     EXPECT_EQ(KV_CMTimeGetSampleTime(T(-1, 600), T(1, 30)), T(0, 30));
 }
 
+TEST(KVTime, CountsFramesAtARate)
+{
+    EXPECT_EQ(VexTimeToRealFrameWithRate(T(1, 2), 25), 12.5);
+    struct Row {
+        CMTime time;
+        double rate;
+        std::int64_t frame;
+    } const rows[] = {
+        {T(1, 2), 25, 12},
+        {T(-1, 2), 25, -13},
+        {T(1001, 30000), 29.97002997002997, 1}, // a breath below frame 1
+        {T(99999, 100000), 1, 0},
+        {T(99999999, 100000000), 1, 1},
+        {plusInfinity, 25, highest},
+        {minusInfinity, 25, lowest},
+        {invalid, 25, 0},
+        {T(1, 1), std::numeric_limits<double>::max(), highest},
+    };
+    for (Row const& row : rows)
+        EXPECT_EQ(VexTimeToFrameWithRate(row.time, row.rate), row.frame);
+}
+
 TEST(KVTime, SnapsToAGrid)
 {
     CMTime const frame = T(1001, 24000);

@@ -6,7 +6,8 @@
 
 #include <gmock/gmock.h>
 
-#include <chrono>
+#include <array>
+#include <bitset>
 #include <random>
 
 using namespace timetest;
@@ -175,6 +176,21 @@ private:
                                       KVMakeRef<NSNumber>(1)}; // the first equals the last
     std::mt19937 engine_{7};
 };
+
+// --- Sets as bits ---
+
+using Bits = std::bitset<48>;
+
+/// The half seconds, from 0 on, that lie in an element.
+Bits bitsOf(Array const& array)
+{
+    Bits bits;
+    for (VexTimeRangeObj const* range : array)
+        for (std::size_t i = 0; i < bits.size(); ++i)
+            if (overlap(range->range(), {T(static_cast<std::int64_t>(i), 2), T(1, 2)}))
+                bits.set(i);
+    return bits;
+}
 
 } // namespace
 
@@ -352,4 +368,41 @@ TEST(VexTimeRanges, WholeSetsAgreeWithRangeByRange)
                        source.exactRecords);
         }
     }
+}
+
+TEST(VexTimeRanges, WhatTheyCoverObeysTheLawsOfSets)
+{
+    std::mt19937 engine(3);
+    // With a timescale in common and without one, which are two ways of calculating.
+    for (auto const& scales : {std::array{2, 600}, std::array{1996488706, 2000000014}})
+        for (int i = 0; i < 300 && !testing::Test::HasFailure(); ++i) {
+            auto const next = [&] {
+                std::vector<CMTimeRange> ranges(engine() % 6);
+                for (CMTimeRange& range : ranges) {
+                    std::int32_t const scale = scales[engine() % 2];
+                    auto const time = [&](std::int64_t half) {
+                        return T(half * (scale / 2), scale);
+                    };
+                    range.start = time(static_cast<std::int64_t>(engine() % 40));
+                    range.duration = time(static_cast<std::int64_t>(engine() % 9));
+                }
+                return array(ranges);
+            };
+            Array const a = next(), b = next();
+            Bits const inA = bitsOf(a), inB = bitsOf(b);
+            Array const sum = VexTimeRangesAddUnsortedRanges(a, b);
+            Array const difference = VexTimeRangesSubtractUnsortedRanges(a, b);
+            EXPECT_EQ(bitsOf(sum), inA | inB);
+            EXPECT_EQ(bitsOf(VexTimeRangesMix(a, b)), inA | inB);
+            EXPECT_EQ(bitsOf(difference), inA & ~inB);
+            EXPECT_EQ(bitsOf(VexTimeRangesANDMask(a, b)), inA & inB);
+            EXPECT_EQ(bitsOf(VexTimeRangesCollapseRangeAndObjects(a)), inA);
+            // A second time changes nothing.
+            EXPECT_THAT(VexTimeRangesAddUnsortedRanges(sum, b),
+                        testing::Pointwise(testing::Truly([](auto const& pair) {
+                                               return std::get<0>(pair)->isEqual(std::get<1>(pair));
+                                           }),
+                                           sum));
+            EXPECT_EQ(VexTimeRangesSubtractUnsortedRanges(difference, b), difference);
+        }
 }
