@@ -107,6 +107,7 @@
 
 #include <korvane/captions/KVCaption.h>
 #include <korvane/captions/KVCaptionCEA608.h>
+#include <korvane/captions/KVCaptionGroups.h>
 #include <korvane/captions/KVCaptionSRT.h>
 #include <korvane/captions/KVCaptionText.h>
 #include <korvane/captions/KVCaptioniTT.h>

@@ -1,4 +1,5 @@
 // Shown by docs/captions.md. Its arguments are a file to read and one to write.
+#include <korvane/captions/KVCaptionGroups.h>
 #include <korvane/captions/KVSRTCaptionsExporter.h>
 #include <korvane/captions/KVSRTCaptionsImporter.h>
 

@@ -5,44 +5,15 @@
 
 #include <korvane/platform/CFNumber.h>
 
-#include <array>
-#include <cstring>
-#include <functional>
-
-namespace {
-
-/// Value, timescale, flags and epoch of the start, then of the duration.
-using RangeFields = std::array<std::int64_t, 8>;
-
-void encodeTimeRange(NSCoder& coder, CMTimeRange const& range, std::string_view key)
-{
-    auto const& [start, duration] = range;
-    RangeFields const fields = {start.value,    start.timescale,    start.flags,    start.epoch,
-                                duration.value, duration.timescale, duration.flags, duration.epoch};
-    coder.encodeBytes(fields.data(), sizeof fields, key);
-}
-
-CMTimeRange decodeTimeRange(NSCoder const& coder, std::string_view key)
-{
-    auto const bytes = coder.decodeBytes(key);
-    RangeFields fields;
-    if (!bytes || bytes->size() != sizeof fields)
-        return kCMTimeRangeZero;
-    std::memcpy(fields.data(), bytes->data(), sizeof fields);
-    auto const timeAt = [&fields](std::size_t i) {
-        return CMTime{fields[i], static_cast<CMTimeScale>(fields[i + 1]),
-                      static_cast<std::uint32_t>(fields[i + 2]), fields[i + 3]};
-    };
-    return {timeAt(0), timeAt(4)};
-}
-
-} // namespace
+#include <korvane/time/KVTimeCoding.h>
+#include <korvane/time/VexTimeRangeObj.h>
 
 KVCaption::KVCaption(NSAttributedString const* string, CMTimeRange const& timeRange)
     : attributedStringInternal_(string ? string->copy() : nullptr), timeRange_(timeRange)
 {}
 
-KVCaption::KVCaption(NSCoder& coder) : timeRange_(decodeTimeRange(coder, "timeRange"))
+KVCaption::KVCaption(NSCoder& coder)
+    : timeRange_(KVDecodeCMTimeRange(coder, "timeRange").value_or(kCMTimeRangeZero))
 {
     KVNSRef<NSObject*> const string =
         coder.decodeObject("attributedString", {&NSAttributedString::coding});
@@ -101,26 +72,10 @@ bool KVCaption::isEqual(NSObject const* other) const
            CFEqual(caption->attributedStringInternal_.get(), attributedStringInternal_.get());
 }
 
-namespace {
-
-/// The same for times that are equal by value: a 64-bit number is exact in `long double`, so equal
-/// fractions have one quotient.
-std::size_t hashOfTime(CMTime const& time)
-{
-    if (!CMTimeIsNumeric(time) || time.timescale == 0)
-        return 0;
-    return std::hash<double>()(
-        static_cast<double>(static_cast<long double>(time.value) / time.timescale));
-}
-
-} // namespace
-
 std::size_t KVCaption::hash() const
 {
-    std::size_t hash = CFHash(attributedStringInternal_);
-    hash = hash * 31 + hashOfTime(timeRange_.start);
-    hash = hash * 31 + hashOfTime(timeRange_.duration);
-    return hash * 31 + static_cast<std::size_t>(format());
+    std::size_t const hash = CFHash(attributedStringInternal_) * 31;
+    return (hash + VexTimeRangeObj(timeRange_).hash()) * 31 + static_cast<std::size_t>(format());
 }
 
 KVString KVCaption::description() const
@@ -158,7 +113,7 @@ NSCodingClass const KVCaption::coding = {
 void KVCaption::encodeWithCoder(NSCoder& coder) const
 {
     coder.encodeObject(attributedStringInternal_, "attributedString");
-    encodeTimeRange(coder, timeRange_, "timeRange");
+    KVEncodeCMTimeRange(coder, timeRange_, "timeRange");
     coder.encodeInt64(format(), "format");
 }
 
@@ -216,16 +171,6 @@ void KVMutableCaptionProtocol::setFontStyle(int style, NSRange range)
         string.applyFontTraits(
             style == KVCaption::fontStyleItalic ? NSItalicFontMask : NSUnitalicFontMask, range);
     });
-}
-
-KVCaption* KVMutableCaption::newCopy() const
-{
-    return new KVMutableCaption(*this);
-}
-
-KVNSRef<KVMutableCaption*> KVMutableCaption::copy() const
-{
-    return KVMakeRef<KVMutableCaption>(*this);
 }
 
 NSCodingClass const KVMutableCaption::coding = {

@@ -3,6 +3,8 @@
 #include <korvane/platform/CMTimeRange.h>
 #include <korvane/platform/NSAttributedString.h>
 
+#include <vector>
+
 /// Styled text that is shown over a time range; immutable. The classes for what a delivery format
 /// adds derive from it: KVCaptionSRT, KVCaptionCEA608 and KVCaptioniTT, and each has a mutable
 /// partner.
@@ -70,7 +72,10 @@ public:
     /// `dynamic_cast` to KVMutableCaptionProtocol to change it.
     KVNSRef<KVCaption*> mutableCopy() const;
 
-    // --- Archive: keys "attributedString", "timeRange", "format" (written, not read back) ---
+    // --- Archive ---
+
+    /// Keys "attributedString", "timeRange" (see KVTimeCoding.h), "format" (written, not read
+    /// back).
 
     static NSCodingClass const coding;
     NSCodingClass const& codingClass() const override { return coding; }
@@ -83,3 +88,6 @@ protected:
     KVNSRef<NSAttributedString const*> attributedStringInternal_;
     CMTimeRange timeRange_;
 };
+
+/// Captions in a row; those functions that need them sorted by start say so.
+using KVCaptionArray = std::vector<KVNSRef<KVCaption*>>;

@@ -2,12 +2,12 @@
 
 KVCaptionCEA608::KVCaptionCEA608(NSAttributedString const* string, CMTimeRange const& timeRange,
                                  long long cellX, long long cellY, long long height,
-                                 long long animation, long long scrollBehavior)
+                                 long long animationBehavior, long long scrollBehavior)
     : KVCaption(string, timeRange),
       cellX_(cellX),
       cellY_(cellY),
       height_(height),
-      animationBehavior_(animation),
+      animationBehavior_(animationBehavior),
       scrollBehavior_(scrollBehavior)
 {}
 
@@ -90,16 +90,6 @@ void KVCaptionCEA608::encodeWithCoder(NSCoder& coder) const
     coder.encodeInt64(height_, "height");
     coder.encodeInt64(animationBehavior_, "animationBehavior");
     coder.encodeInt64(scrollBehavior_, "scrollBehavior");
-}
-
-KVCaption* KVMutableCaptionCEA608::newCopy() const
-{
-    return new KVMutableCaptionCEA608(*this);
-}
-
-KVNSRef<KVMutableCaptionCEA608*> KVMutableCaptionCEA608::copy() const
-{
-    return KVMakeRef<KVMutableCaptionCEA608>(*this);
 }
 
 NSCodingClass const KVMutableCaptionCEA608::coding = {

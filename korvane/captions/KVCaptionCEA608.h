@@ -15,7 +15,7 @@ class KVMutableCaptionCEA608;
 class KV_EXPORT KVCaptionCEA608 : public KVCaption {
 public:
     KVCaptionCEA608(NSAttributedString const* string, CMTimeRange const& timeRange, long long cellX,
-                    long long cellY, long long height, long long animation,
+                    long long cellY, long long height, long long animationBehavior,
                     long long scrollBehavior);
     explicit KVCaptionCEA608(NSCoder& coder);
 
@@ -53,7 +53,8 @@ protected:
     long long scrollBehavior_;
 };
 
-class KV_EXPORT KVMutableCaptionCEA608 final : public KVMutableCaptionOf<KVCaptionCEA608> {
+class KV_EXPORT KVMutableCaptionCEA608 final
+    : public KVMutableCaptionOf<KVCaptionCEA608, KVMutableCaptionCEA608> {
 public:
     using KVMutableCaptionOf::KVMutableCaptionOf;
 
@@ -63,9 +64,5 @@ public:
     void setAnimationBehavior(long long behavior) noexcept { animationBehavior_ = behavior; }
     void setScrollBehavior(long long behavior) noexcept { scrollBehavior_ = behavior; }
 
-    KVCaption* newCopy() const override;
-    KVNSRef<KVMutableCaptionCEA608*> copy() const;
-
     static NSCodingClass const coding;
-    NSCodingClass const& codingClass() const override { return coding; }
 };

@@ -35,16 +35,6 @@ NSCodingClass const KVCaptionSRT::coding = {
     "KVCaptionSRT",
     [](NSCoder& coder) -> KVNSRef<NSObject*> { return KVMakeRef<KVCaptionSRT>(coder); }};
 
-KVCaption* KVMutableCaptionSRT::newCopy() const
-{
-    return new KVMutableCaptionSRT(*this);
-}
-
-KVNSRef<KVMutableCaptionSRT*> KVMutableCaptionSRT::copy() const
-{
-    return KVMakeRef<KVMutableCaptionSRT>(*this);
-}
-
 NSCodingClass const KVMutableCaptionSRT::coding = {
     "KVMutableCaptionSRT",
     [](NSCoder& coder) -> KVNSRef<NSObject*> { return KVMakeRef<KVMutableCaptionSRT>(coder); }};

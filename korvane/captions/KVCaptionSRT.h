@@ -12,6 +12,7 @@ class KVMutableCaptionSRT;
 class KV_EXPORT KVCaptionSRT : public KVCaption {
 public:
     KVCaptionSRT(NSAttributedString const* string, CMTimeRange const& timeRange);
+    /// What the coder has, its background as it stands.
     explicit KVCaptionSRT(NSCoder& coder) : KVCaption(coder) {}
 
     int format() const noexcept override { return 3; }
@@ -28,13 +29,10 @@ protected:
     void assignAttributedString(NSAttributedString const* string) override;
 };
 
-class KV_EXPORT KVMutableCaptionSRT final : public KVMutableCaptionOf<KVCaptionSRT> {
+class KV_EXPORT KVMutableCaptionSRT final
+    : public KVMutableCaptionOf<KVCaptionSRT, KVMutableCaptionSRT> {
 public:
     using KVMutableCaptionOf::KVMutableCaptionOf;
 
-    KVCaption* newCopy() const override;
-    KVNSRef<KVMutableCaptionSRT*> copy() const;
-
     static NSCodingClass const coding;
-    NSCodingClass const& codingClass() const override { return coding; }
 };

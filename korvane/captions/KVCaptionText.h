@@ -22,7 +22,8 @@ KVAttributedStringFromCaption(AVCaption const* caption);
 // --- To and from the player's captions; null gives null ---
 
 /// The region selects the class: cells make a KVCaptionCEA608, a named region a KVCaptioniTT with
-/// its ruby, SubRip's region or none a KVCaptionSRT.
+/// its ruby, SubRip's region or none a KVCaptionSRT. The caption's `animation` and the region's
+/// `scroll` are the `animationBehavior` and the `scrollBehavior` of a KVCaptionCEA608.
 KV_EXPORT KVNSRef<KVCaption*> KVCaptionFromAVCaption(AVCaption const* caption);
 KV_EXPORT KVNSRef<AVCaption*> KVCaptionToAVCaption(KVCaption const* caption);
 /// By format: SubRip's bottom region for 0 and 3, cells for 1, the named region for 2.
@@ -31,18 +32,3 @@ KV_EXPORT KVNSRef<AVCaptionRegion*> AVCaptionRegionFromKVCaption(KVCaption const
 KV_EXPORT void KVSetRubyFromAVCaption(KVMutableCaptioniTT* caption, AVCaption const* from);
 /// Gives the caption the attributes of a string with the same text. Nothing if either is null.
 KV_EXPORT void KVSetAttributedStringToCaption(AVCaption* caption, NSAttributedString const* string);
-
-/// A row of captions in time order, as the functions on many captions take it.
-using KVCaptionArray = std::vector<KVNSRef<KVCaption*>>;
-
-/// Cuts a row of captions, sorted by start, into groups that overlap in time. A caption joins the
-/// group before it if it starts before the latest end in there, with `includeTouching` also if it
-/// starts just then.
-///
-///     KVGroupOverlappingCaptions(captions, false);   // [0,2) [2,3) [5,6): three groups
-///     KVGroupOverlappingCaptions(captions, true);    // two, the first with two captions
-///
-/// Nulls are passed over. Captions that equal one of a finished group are dropped with it, although
-/// they did not join. Takes time in proportion to the number of captions.
-KV_EXPORT std::vector<KVCaptionArray> KVGroupOverlappingCaptions(KVCaptionArray const& captions,
-                                                                 bool includeTouching);

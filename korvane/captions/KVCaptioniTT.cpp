@@ -139,16 +139,6 @@ void KVMutableCaptioniTT::setRubyText(KVString const& ruby, NSRange range)
         recalculateHasRuby();
 }
 
-KVCaption* KVMutableCaptioniTT::newCopy() const
-{
-    return new KVMutableCaptioniTT(*this);
-}
-
-KVNSRef<KVMutableCaptioniTT*> KVMutableCaptioniTT::copy() const
-{
-    return KVMakeRef<KVMutableCaptioniTT>(*this);
-}
-
 NSCodingClass const KVMutableCaptioniTT::coding = {
     "KVMutableCaptioniTT",
     [](NSCoder& coder) -> KVNSRef<NSObject*> { return KVMakeRef<KVMutableCaptioniTT>(coder); }};

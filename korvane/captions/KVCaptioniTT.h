@@ -58,7 +58,8 @@ protected:
     bool hasRubyInternal_ = false;
 };
 
-class KV_EXPORT KVMutableCaptioniTT final : public KVMutableCaptionOf<KVCaptioniTT> {
+class KV_EXPORT KVMutableCaptioniTT final
+    : public KVMutableCaptionOf<KVCaptioniTT, KVMutableCaptioniTT> {
 public:
     using KVMutableCaptionOf::KVMutableCaptionOf;
 
@@ -66,9 +67,5 @@ public:
     /// The null string removes the ruby.
     void setRubyText(KVString const& ruby, NSRange range);
 
-    KVCaption* newCopy() const override;
-    KVNSRef<KVMutableCaptioniTT*> copy() const;
-
     static NSCodingClass const coding;
-    NSCodingClass const& codingClass() const override { return coding; }
 };

@@ -30,12 +30,20 @@ protected:
     virtual NSAttributedString const* styledString() const noexcept = 0;
 };
 
-/// The write operations over one of the immutable classes. It adds no state.
-template <class Immutable>
+/// The write operations over one of the immutable classes, for the class `Mutable` that derives
+/// from this and has a `coding` of its own. It adds no state.
+template <class Immutable, class Mutable>
 class KVMutableCaptionOf : public Immutable, public KVMutableCaptionProtocol {
 public:
     using Immutable::Immutable;
     explicit KVMutableCaptionOf(Immutable const& other) : Immutable(other) {}
+
+    KVCaption* newCopy() const override { return copy().leak(); }
+    KVNSRef<Mutable*> copy() const
+    {
+        return KVMakeRef<Mutable>(static_cast<Mutable const&>(*this));
+    }
+    NSCodingClass const& codingClass() const override { return Mutable::coding; }
 
     void setAttributedString(NSAttributedString const* string) override
     {
@@ -50,13 +58,9 @@ protected:
     }
 };
 
-class KV_EXPORT KVMutableCaption final : public KVMutableCaptionOf<KVCaption> {
+class KV_EXPORT KVMutableCaption final : public KVMutableCaptionOf<KVCaption, KVMutableCaption> {
 public:
     using KVMutableCaptionOf::KVMutableCaptionOf;
 
-    KVCaption* newCopy() const override;
-    KVNSRef<KVMutableCaption*> copy() const;
-
     static NSCodingClass const coding;
-    NSCodingClass const& codingClass() const override { return coding; }
 };

@@ -1,13 +1,14 @@
 #pragma once
 
-#include <korvane/captions/KVCaptionText.h>
+#include <korvane/captions/KVCaption.h>
 
 #include <korvane/foundation/KVURL.h>
 #include <korvane/platform/NSError.h>
 
 #include <string>
 
-/// Writes captions of any format as a SubRip file in UTF-8.
+/// Writes captions of any format as a SubRip file in UTF-8. May be called from any thread, with
+/// captions that nobody changes meanwhile.
 ///
 ///     auto error = KVSRTCaptionsExporter::exportCaptionsToURL(url, captions, CMTimeMake(1, 25),
 ///                                                             kCMTimeZero, true);

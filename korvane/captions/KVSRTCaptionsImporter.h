@@ -1,6 +1,6 @@
 #pragma once
 
-#include <korvane/captions/KVCaptionText.h>
+#include <korvane/captions/KVCaption.h>
 
 #include <korvane/foundation/KVURL.h>
 #include <korvane/platform/NSError.h>
@@ -21,10 +21,11 @@
 ///         captions[0][0]->text();   // "Who is there?"
 ///
 /// Numbers must be 1, 2, 3 and so on; tags are `<b>`, `<i>`, `<u>`, `<br>` and
-/// `<font color="...">` in angle or curly brackets, and others are dropped. Three things that
-/// files rely on and that surprise: `</font>` ends nothing, so a colour holds for all text behind
-/// it, in later captions too (use one importer a file); a closing tag without an opening one
-/// cancels the next opening one; the line behind the time line is text even if it is empty.
+/// `<font color="...">` in angle or curly brackets; unknown ones of three letters or more are
+/// dropped, shorter ones stay as text. Three things that files rely on and that surprise: `</font>`
+/// ends nothing, so a colour holds for all text behind it, in later captions too (use one importer
+/// a file); a closing tag without an opening one cancels the next opening one; the line behind the
+/// time line is text even if it is empty.
 ///
 /// One importer belongs to one thread.
 class KV_EXPORT KVSRTCaptionsImporter final : public NSObject {
