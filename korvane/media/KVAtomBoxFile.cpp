@@ -1,12 +1,11 @@
 #include <korvane/media/KVAtomBoxFile.h>
 
 #include <korvane/media/KVAtomBytes_p.h>
+#include <korvane/media/KVAtomStatus_p.h>
 #include <korvane/media/KVAtomStreams_p.h>
 
 #include <algorithm>
 #include <cerrno>
-#include <new>
-#include <stdexcept>
 #include <utility>
 
 namespace {
@@ -15,20 +14,6 @@ constexpr std::uint64_t kPiece = 4096;
 /// A hole shorter than this is copied as zeros.
 constexpr std::uint64_t kSmallestHole = 64 * 1024;
 constexpr int kCancelled = 2;
-
-/// -1 where memory runs out. Sizes are compared with the file's length before anything is allocated
-/// for them, but the file may be longer than memory is large.
-template <class Function>
-int orOutOfMemory(Function function)
-{
-    try {
-        return function();
-    } catch (std::bad_alloc const&) {
-        return -1;
-    } catch (std::length_error const&) {
-        return -1;
-    }
-}
 
 } // namespace
 

@@ -1,10 +1,10 @@
 #include <korvane/media/KVAtomMetadataHandler.h>
 
+#include <korvane/media/KVAtomStatus_p.h>
 #include <korvane/media/KVMovieMetadata_p.h>
+#include <korvane/platform/CFDictionary_p.h>
 
 #include <algorithm>
-#include <new>
-#include <stdexcept>
 #include <string>
 
 namespace {
@@ -47,9 +47,7 @@ void setUUIDAtomBox(KVAtomBox& parent, CFDataRef payload)
 
 } // namespace
 
-KVAtomMetadataHandler::KVAtomMetadataHandler()
-    : metadata_(KVCFRef<CFMutableDictionaryRef>::adopt(CFDictionaryCreateMutable(nullptr, 0)))
-{}
+KVAtomMetadataHandler::KVAtomMetadataHandler() : metadata_(kv::makeDictionary()) {}
 
 KVAtomMetadataHandler::KVAtomMetadataHandler(KVAtomMetadataHandler const& other)
     : KVAtomBoxFile(other),
@@ -136,33 +134,31 @@ void KVAtomMetadataHandler::readUUIDAtomBoxes()
 }
 
 int KVAtomMetadataHandler::readMetadata()
-try {
-    if (int const code = readFileStructure())
-        return code;
-    readUUIDAtomBoxes();
-    if (readImageDescriptionData() != 0)
-        return 0;
+{
+    return orOutOfMemory([&] {
+        if (int const code = readFileStructure())
+            return code;
+        readUUIDAtomBoxes();
+        if (readImageDescriptionData() != 0)
+            return 0;
 
-    auto const xmp = createParsedAdobeXMPMetadata(textOf(metadata_, kKVAdobeXMPMetadata));
-    if (xmp->count() > 0) {
-        char const* const key = xmp->value("proj:type")              ? kKVPanoMetadata
-                                : xmp->value("GPano:ProjectionType") ? kKVPhotoSphereMetadata
-                                : xmp->value("xmlns:exif")           ? kKVEXIFMetadata
-                                                                     : kKVAdobeXMPMetadata;
-        metadata_->setValue(kKVAdobeXMPMetadata, nullptr);
-        metadata_->setValue(key, xmp);
-    }
-    setIfNotEmpty(metadata_, kKVGoogleV1Metadata,
-                  createParsedGoogleV1Metadata(textOf(metadata_, kKVGoogleV1Metadata)));
-    setIfNotEmpty(metadata_, kKVGoogleV2Metadata, createParsedGoogleV2Metadata(*imageDesc_));
-    setIfNotEmpty(metadata_, kKVHDRMetadata, createParsedHDRMetadata(*imageDesc_));
-    setIfNotEmpty(metadata_, kKVStandardExtensionsMetadata,
-                  createParsedStandardExtensionData(*imageDesc_));
-    return 0;
-} catch (std::bad_alloc const&) {
-    return -1;
-} catch (std::length_error const&) {
-    return -1;
+        auto const xmp = createParsedAdobeXMPMetadata(textOf(metadata_, kKVAdobeXMPMetadata));
+        if (xmp->count() > 0) {
+            char const* const key = xmp->value("proj:type")              ? kKVPanoMetadata
+                                    : xmp->value("GPano:ProjectionType") ? kKVPhotoSphereMetadata
+                                    : xmp->value("xmlns:exif")           ? kKVEXIFMetadata
+                                                                         : kKVAdobeXMPMetadata;
+            metadata_->setValue(kKVAdobeXMPMetadata, nullptr);
+            metadata_->setValue(key, xmp);
+        }
+        setIfNotEmpty(metadata_, kKVGoogleV1Metadata,
+                      createParsedGoogleV1Metadata(textOf(metadata_, kKVGoogleV1Metadata)));
+        setIfNotEmpty(metadata_, kKVGoogleV2Metadata, createParsedGoogleV2Metadata(*imageDesc_));
+        setIfNotEmpty(metadata_, kKVHDRMetadata, createParsedHDRMetadata(*imageDesc_));
+        setIfNotEmpty(metadata_, kKVStandardExtensionsMetadata,
+                      createParsedStandardExtensionData(*imageDesc_));
+        return 0;
+    });
 }
 
 KVCFRef<CFDictionaryRef> KVAtomMetadataHandler::copyMetadata() const
@@ -191,29 +187,28 @@ int KVAtomMetadataHandler::writeMetadataWithUpdates()
 }
 
 int KVAtomMetadataHandler::updateAtomsWithMetadata()
-try {
-    KVAtomBox* const track = getVideoTrack();
-    if ((!track || !imageDesc_) && readImageDescriptionData() != 0)
-        return -1;
-    writeAdobeXMPMetadata();
-    writeGoogleV1Metadata();
-    writeGoogleV2Metadata();
-    writeHDRMetadata();
-    writeStandardExtensionMetadata();
+{
+    return orOutOfMemory([&] {
+        KVAtomBox* const track = getVideoTrack();
+        if ((!track || !imageDesc_) && readImageDescriptionData() != 0)
+            return -1;
+        writeAdobeXMPMetadata();
+        writeGoogleV1Metadata();
+        writeGoogleV2Metadata();
+        writeHDRMetadata();
+        writeStandardExtensionMetadata();
 
-    auto const payload = imageDesc_->copyFullImageDescToData(getFileType() == KVAtomType("qt  "));
-    KVAtomBox* const atom = videoTrack_->findFirstChild(true, KVAtomType("stsd"));
-    if (!payload || !atom)
-        return -1;
-    atom->setPayloadData(payload);
-    atom->updateSize();
-    atom->updateParentSizes();
-    imageDesc_.emplace(payload);
-    return 0;
-} catch (std::bad_alloc const&) {
-    return -1;
-} catch (std::length_error const&) {
-    return -1;
+        auto const payload =
+            imageDesc_->copyFullImageDescToData(getFileType() == KVAtomType("qt  "));
+        KVAtomBox* const atom = videoTrack_->findFirstChild(true, KVAtomType("stsd"));
+        if (!payload || !atom)
+            return -1;
+        atom->setPayloadData(payload);
+        atom->updateSize();
+        atom->updateParentSizes();
+        imageDesc_.emplace(payload);
+        return 0;
+    });
 }
 
 void KVAtomMetadataHandler::writeAdobeXMPMetadata()

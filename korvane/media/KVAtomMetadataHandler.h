@@ -68,7 +68,7 @@ public:
     /// nothing, and where there is no video track.
     int readMetadata();
 
-    /// A copy of the metadata that never changes.
+    /// The metadata as it is now, in a copy that later changes do not reach.
     KVCFRef<CFDictionaryRef> copyMetadata() const;
     /// For each of the five keys below: takes the dictionary that `metadata` holds under it, or
     /// removes what was there if it holds none. Other keys stay. Null does nothing.

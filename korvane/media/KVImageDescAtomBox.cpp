@@ -1,6 +1,7 @@
 #include <korvane/media/KVImageDescAtomBox.h>
 
 #include <korvane/media/KVAtomBytes_p.h>
+#include <korvane/platform/CFDictionary_p.h>
 
 #include <algorithm>
 #include <cstring>
@@ -48,16 +49,11 @@ CFDataRef dataNamed(CFDictionaryRef dictionary, unsigned int type)
     return dynamic_cast<CFDataRef>(dictionary->value(typeName(type)));
 }
 
-KVCFRef<CFMutableDictionaryRef> makeDictionary()
-{
-    return KVCFRef<CFMutableDictionaryRef>::adopt(CFDictionaryCreateMutable(nullptr, 0));
-}
-
 /// The entries of those names that hold data.
 KVCFRef<CFMutableDictionaryRef> selectData(CFDictionaryRef dictionary,
                                            std::span<unsigned int const> types)
 {
-    auto selected = makeDictionary();
+    auto selected = kv::makeDictionary();
     for (unsigned int const type : types)
         if (CFDataRef const data = dataNamed(dictionary, type))
             selected->setValue(typeName(type), data);
@@ -399,7 +395,7 @@ KVCFRef<CFMutableDictionaryRef>
 KVImageDescAtomBox::copyAtomBoxChildPayloads(KVAtomBox const* atom,
                                              std::span<unsigned int const> types) const
 {
-    auto payloads = makeDictionary();
+    auto payloads = kv::makeDictionary();
     for (unsigned int const type : types) {
         KVAtomBox const* const child = atom ? atom->findFirstChild(true, type) : nullptr;
         // One that was made here has no place in the source.

@@ -26,6 +26,8 @@
 ///
 /// Descriptions are counted from 0. Where one is malformed, what was read of it stays usable and is
 /// what gets written; bytes that are in no atom of the tree are not.
+///
+/// Used by one thread at a time.
 class KV_EXPORT KVImageDescAtomBox {
 public:
     /// Without descriptions.

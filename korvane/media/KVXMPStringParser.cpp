@@ -1,5 +1,7 @@
 #include <korvane/media/KVXMPStringParser.h>
 
+#include <korvane/platform/CFDictionary_p.h>
+
 #include <algorithm>
 #include <exception>
 #include <libxml/parser.h>
@@ -22,11 +24,6 @@ int levelOfName(KVString const& name) noexcept
             if (name.view() == known)
                 return level;
     return -1;
-}
-
-KVCFRef<CFMutableDictionaryRef> makeDictionary()
-{
-    return KVCFRef<CFMutableDictionaryRef>::adopt(CFDictionaryCreateMutable(nullptr, 0));
 }
 
 /// Comparing each attribute of an element with all before it takes the XML parser quadratic time.
@@ -103,7 +100,7 @@ struct KVXMPStringParser::Handlers {
     static void startElement(void* user, xmlChar const* name, xmlChar const** attributes) noexcept
     {
         guard(user, [&](KVXMPStringParser& parser) {
-            auto const dictionary = makeDictionary();
+            auto const dictionary = kv::makeDictionary();
             for (; attributes && attributes[0]; attributes += 2)
                 dictionary->setValue(fromXML(attributes[0]).cf_str(),
                                      fromXML(attributes[1]).cf_str());
@@ -137,7 +134,7 @@ struct KVXMPStringParser::Handlers {
     static void warning(void*, char const*, ...) noexcept {}
 };
 
-KVXMPStringParser::KVXMPStringParser() : result_(makeDictionary()) {}
+KVXMPStringParser::KVXMPStringParser() : result_(kv::makeDictionary()) {}
 
 KVXMPStringParser::~KVXMPStringParser() = default;
 
@@ -214,7 +211,7 @@ void KVXMPStringParser::startDocument()
         level = Level();
     text_.clear();
     hasText_ = false;
-    result_ = makeDictionary();
+    result_ = kv::makeDictionary();
 }
 
 void KVXMPStringParser::startElement(KVString const& name, CFDictionaryRef attributes)
@@ -223,7 +220,7 @@ void KVXMPStringParser::startElement(KVString const& name, CFDictionaryRef attri
         // A level inside itself, or around one that is inside it, starts anew.
         for (int level = opened; level <= kInner; ++level)
             levels_[level] = Level();
-        levels_[opened] = {name, makeDictionary()};
+        levels_[opened] = {name, kv::makeDictionary()};
     }
     text_.clear();
     hasText_ = true;
@@ -263,7 +260,7 @@ void KVXMPStringParser::storeText(KVString const& name)
         target.setValue(name.cf_str(), text.cf_str());
         return;
     }
-    auto const both = makeDictionary();
+    auto const both = kv::makeDictionary();
     if (auto const* const dictionary = dynamic_cast<CFDictionaryRef>(old)) {
         for (std::size_t i = 0; i < dictionary->count(); ++i)
             both->setValue(dictionary->keyAtIndex(i), dictionary->valueAtIndex(i));

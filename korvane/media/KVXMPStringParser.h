@@ -29,6 +29,8 @@
 ///
 /// The text is UTF-8 whatever the packet declares. Entities other than the five of XML are not
 /// known, nothing is loaded from elsewhere, and elements nest 256 deep at most.
+///
+/// A parser belongs to one thread at a time.
 class KV_EXPORT KVXMPStringParser : public NSObject {
 public:
     KVXMPStringParser();

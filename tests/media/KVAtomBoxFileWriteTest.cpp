@@ -61,6 +61,28 @@ void grow(Rewrite& rewrite, std::size_t by)
     insertAtom(rewrite.find("moov"), "free", std::string(by - 8, 'x'), 999);
 }
 
+std::string makePipe(TemporaryFolder const& folder)
+{
+    std::string const path = folder.path("pipe");
+    EXPECT_EQ(mkfifo(path.c_str(), 0600), 0);
+    return path;
+}
+
+/// Reads the pipe to its end, at most so many bytes at once, and tells after each how many there
+/// were up to there.
+template <class See>
+std::thread readPipe(std::string const& path, std::size_t most, See see)
+{
+    return std::thread([=] {
+        int const file = ::open(path.c_str(), O_RDONLY);
+        char bytes[4096];
+        std::size_t total = 0;
+        for (ssize_t got; (got = ::read(file, bytes, std::min(most, sizeof bytes))) > 0;)
+            see(total += static_cast<std::size_t>(got));
+        ::close(file);
+    });
+}
+
 } // namespace
 
 // --- Movies ---
@@ -363,7 +385,26 @@ TEST(KVAtomBoxFileWrite, AFullDiskIsNoSuccess)
     }
 }
 
-// --- Cancelling ---
+// --- From another thread ---
+
+TEST(KVAtomBoxFileWrite, ProgressIsSeenFromAnotherThread)
+{
+    std::string const input = atom("mdat", std::string(2 << 20, 'm'));
+    Rewrite rewrite(input);
+    std::string const pipe = makePipe(rewrite.folder);
+    std::thread reader = readPipe(pipe, 4096, [&](std::size_t total) {
+        double const done = rewrite.file.getWritePercentDone() / 100 * double(input.size());
+        // A piece is counted once it is written; what is ahead lies in the block and in the pipe.
+        EXPECT_GE(done, double(total) - 4096.5);
+        EXPECT_LE(done, double(total) + (1 << 18));
+        EXPECT_TRUE(rewrite.file.getWriteDoneResult() == 0 || total > input.size() / 2);
+    });
+    EXPECT_EQ(rewrite.file.openOutputFile(url(pipe).cf_url()), 0);
+    EXPECT_EQ(rewrite.file.writeAtomBoxFileWithUpdates(), 0);
+    rewrite.file.closeOutputFile();
+    reader.join();
+    EXPECT_EQ(rewrite.file.getWritePercentDone(), 100);
+}
 
 TEST(KVAtomBoxFileWrite, CancellingEndsTheWriteAtEveryStage)
 {
@@ -373,19 +414,12 @@ TEST(KVAtomBoxFileWrite, CancellingEndsTheWriteAtEveryStage)
     for (std::size_t const after : {1u, 5000u, 400'000u}) {
         Rewrite rewrite(atom("free") + atom("mdat", media));
         insertAtom(rewrite.file, "uuid", std::string(300'000, 'u'), 1);
-        std::string const pipe = rewrite.folder.path("pipe");
-        ASSERT_EQ(mkfifo(pipe.c_str(), 0600), 0);
+        std::string const pipe = makePipe(rewrite.folder);
         std::size_t total = 0;
-        std::thread reader([&] {
-            int const file = ::open(pipe.c_str(), O_RDONLY);
-            std::vector<char> bytes(4096);
-            for (ssize_t got;
-                 (got = ::read(file, bytes.data(), std::min(after, bytes.size()))) > 0;) {
-                total += static_cast<std::size_t>(got);
-                if (total >= after)
-                    rewrite.file.cancelWrite();
-            }
-            ::close(file);
+        std::thread reader = readPipe(pipe, after, [&](std::size_t read) {
+            total = read;
+            if (total >= after)
+                rewrite.file.cancelWrite();
         });
         EXPECT_EQ(rewrite.file.openOutputFile(url(pipe).cf_url()), 0);
         EXPECT_EQ(rewrite.file.writeAtomBoxFileWithUpdates(), 2) << after;
