@@ -93,6 +93,7 @@ public:
     /// one of 0 to 15.
     double doubleValueAtRow(int row, int col) const;
     void setDoubleValue(double value, int row, int col);
+    /// From and to sixteen doubles of the caller's; not null.
     void getDoubles(double* doubles) const noexcept;
     void setDoubles(double const* doubles) noexcept;
     /// Sixteen numbers. Those for 0, 1 and -1 are shared objects, and so is the whole array of an
@@ -103,7 +104,11 @@ public:
     simd_double4x4 SIMDDouble4x4() const noexcept;
     void setSIMDDouble4x4(simd_double4x4 const& columns) noexcept;
 
-    // --- Edit: see KVMatrix44Tmpl ---
+    // --- Edit ---
+    //
+    // As the members of KVMatrix44Tmpl do it. `leftTranslateX`, `leftScaleX`, `leftShearX` and
+    // their `right...` forms are named after their first argument: they move, scale and shear along
+    // all axes that they have arguments for.
 
     bool isIdentity() const noexcept { return matrix_.isIdentity(); }
     void makeIdentity() noexcept { matrix_ = Matrix(); }

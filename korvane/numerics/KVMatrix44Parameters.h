@@ -20,6 +20,7 @@ struct KVMatrix44Parameters {
     std::int32_t rotOrder = 0;
     /// Radians about the x, y and z axis.
     KVVector3<T> rotation;
-    /// How much of x and of y a z column gains; the shear of y by x has no field.
+    /// How much of x (`shear.x`) and of y (`shear.y`) is added to z, before z is scaled. The shear
+    /// of y by x has no field.
     KVVector2<T> shear;
 };

@@ -148,12 +148,6 @@ template <class T>
     put(3, c1 * minors.m02 - c0 * minors.m12 - c2 * minors.m01);
 }
 
-template <class T>
-bool isSingular(T determinant, double least) noexcept
-{
-    return determinant == 0 || std::abs(determinant) < least;
-}
-
 } // namespace
 
 template <class T>
@@ -314,7 +308,7 @@ bool KVMatrix44Tmpl<T>::invert(KVMatrix44Tmpl const& source, double least) noexc
     Minors<T> const a(m, m + 4);
     Minors<T> const b(m + 8, m + 12);
     T const determinant = b.determinantBelow(a);
-    if (isSingular(determinant, least))
+    if (determinant == 0 || std::abs(determinant) < least)
         return false;
     KVMatrix44Tmpl inverse{Unset()};
     T* const out = inverse.data();
