@@ -33,9 +33,7 @@ namespace cc {
 namespace {
 
 constexpr int curveSize = 1024;
-// The format's own limits.
-constexpr long long longestCurve = 65536;
-constexpr long long longestEdge = 256;
+constexpr long long longestCurve = 65536; // the format's own limit
 
 /// Where the rows of the table go that is read.
 struct rows_t {
@@ -123,7 +121,7 @@ int lut_t::readCUBE(tfreader_t& reader, unsigned long index)
             if (counter++ != index)
                 continue;
             long long const edge = leadingInteger(value);
-            if (edge < 1 || edge > longestEdge)
+            if (edge < 1 || edge > kLongestEdge)
                 return kBadData;
             kind = k3D;
             size = static_cast<int>(edge);

@@ -14,7 +14,6 @@ namespace cc {
 namespace {
 
 constexpr std::size_t longestName = 255;
-constexpr int longestEdge = 256;
 
 struct format_entry_t {
     unsigned int format;
@@ -43,10 +42,7 @@ std::string_view lastComponent(std::string_view path)
 std::string nameOf(std::string_view path)
 {
     std::string result(lastComponent(path));
-    std::string lower(result);
-    std::transform(lower.begin(), lower.end(), lower.begin(), [](char c) {
-        return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
-    });
+    std::string const lower = toLower(result);
     for (std::string_view const extension : {".cube", ".mga"})
         if (lower.ends_with(extension)) {
             result.resize(result.size() - extension.size());
@@ -75,7 +71,7 @@ void lut_t::reset()
 
 void lut_t::makeCube(int edge, float minimum, float maximum)
 {
-    bool const valid = edge >= 1 && edge <= longestEdge;
+    bool const valid = edge >= 1 && edge <= kLongestEdge;
     table.clear();
     table.resize(valid ? 3 * cubed(edge) : 0);
     kind = valid ? k3D : kNone;
@@ -86,7 +82,7 @@ void lut_t::makeCube(int edge, float minimum, float maximum)
 
 bool lut_t::isCube() const noexcept
 {
-    return kind == k3D && size >= 1 && size <= longestEdge && table.size() == 3 * cubed(size);
+    return kind == k3D && size >= 1 && size <= kLongestEdge && table.size() == 3 * cubed(size);
 }
 
 // --- Reading ---
@@ -176,7 +172,7 @@ void lut_t::process(processor_t const& processor)
     auto const edge = static_cast<std::size_t>(size);
     float const range = domainMax - domainMin;
     float const step = edge > 1 ? range / static_cast<float>(edge - 1) : 0.0f;
-    std::array<float, longestEdge> grid;
+    std::array<float, kLongestEdge> grid;
     float input = domainMin;
     for (std::size_t i = 0; i < edge; ++i, input += step)
         grid[i] = input;

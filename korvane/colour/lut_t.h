@@ -25,8 +25,9 @@ using rgb_t = std::array<float, 3>;
 /// | Adobe Cube LUT 1.0 | .cube | 1D and 3D, several tables in a file | 3D |
 /// | Pandora 3D LUT | .mga | 3D | 3D |
 ///
-/// Values are 16-bit, 0 to 65535 over the domain. Both formats hold the table as rows of text, so
-/// a table that is written and read again is within one of what it was.
+/// Values are 16-bit, 0 to 65535 over the domain. A .mga file keeps each as it is; a .cube file has
+/// six decimals, of which a value comes back as it was or one lower, if the domain is at least 0.1
+/// wide.
 ///
 /// Used by one thread at a time.
 class KV_EXPORT lut_t {
@@ -64,9 +65,9 @@ public:
 
     /// Reads table number `index`, 0 for the first one, whatever was here before: kSuccess,
     /// kCannotOpen, kUnknownFormat or kBadData, which leaves what was read so far: kind and size as
-    /// the file tells them, and maybe fewer rows than that. An index beyond
-    /// the last table is a success with an empty table of kind 0. A file without a title has its
-    /// name as title.
+    /// the file tells them, and maybe fewer rows than that. An index beyond the last table of a
+    /// .cube file is a success with an empty table of kind 0; of a .mga file any index reads its
+    /// one table. A file without a title has its name as title.
     ///
     /// Limits: 256 points along an edge and 65536 rows for a curve (Adobe Cube LUT 1.0), 16777216
     /// entries for .mga, 1 MiB of a line; no memory is taken for rows that the file is too short
@@ -105,6 +106,8 @@ private:
     bool isCube() const noexcept;
 
     static constexpr std::size_t kLongestLine = std::size_t(1) << 20;
+    /// Points along an edge of a cube.
+    static constexpr int kLongestEdge = 256;
 
     unsigned int format_ = 0;
 };

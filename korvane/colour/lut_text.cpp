@@ -28,14 +28,14 @@ constexpr bool isSpace(char c) noexcept
     return c == ' ' || (c >= '\t' && c <= '\r');
 }
 
-constexpr char toLower(char c) noexcept
+constexpr char lowerOf(char c) noexcept
 {
     return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
 }
 
 constexpr bool isWordCharacter(char c) noexcept
 {
-    return isDigit(c) || c == '_' || (toLower(c) >= 'a' && toLower(c) <= 'z');
+    return isDigit(c) || c == '_' || (lowerOf(c) >= 'a' && lowerOf(c) <= 'z');
 }
 
 template <class Predicate>
@@ -179,10 +179,16 @@ bool tok(std::string_view line, std::string_view key, std::string_view& value)
     return true;
 }
 
-bool namesMGA(std::string_view text)
+std::string toLower(std::string_view text)
 {
     std::string lower(text);
-    std::transform(lower.begin(), lower.end(), lower.begin(), toLower);
+    std::transform(lower.begin(), lower.end(), lower.begin(), lowerOf);
+    return lower;
+}
+
+bool namesMGA(std::string_view text)
+{
+    std::string const lower = toLower(text);
     return lower.find("pandora 3d lut file") != std::string::npos ||
            lower.find("3d cube file") != std::string::npos;
 }

@@ -7,6 +7,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <memory>
+#include <string>
 #include <string_view>
 
 // The words and numbers of LUT files.
@@ -16,6 +17,9 @@ namespace cc {
 /// Whether a header line is `key`, white space and a value, which may be empty. Lines of more than
 /// 4096 bytes are no header lines.
 bool tok(std::string_view line, std::string_view key, std::string_view& value);
+
+/// With "A" to "Z" as small letters.
+std::string toLower(std::string_view text);
 
 /// Whether the text holds "pandora 3d lut file" or "3d cube file", in letters of any case.
 bool namesMGA(std::string_view text);

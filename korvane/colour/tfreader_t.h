@@ -74,6 +74,8 @@ protected:
 /// pair becomes U+FFFD), UTF-8 is passed as it is. A byte-order mark at the start is dropped and
 /// decides the order of UTF-16, which is otherwise the machine's. In UTF-16 the unit 0D0A, a CR LF
 /// of single bytes, ends a line as well.
+///
+/// Used by one thread at a time.
 class KV_EXPORT tfreader_t : public tfhandler_t {
 public:
     /// `encoding` as above. Of a line longer than `lineLimit` bytes (units of UTF-16) the rest is
