@@ -1,5 +1,6 @@
 #include <korvane/foundation/KVURL.h>
 
+#include <algorithm>
 #include <charconv>
 #include <optional>
 
@@ -61,7 +62,7 @@ std::optional<std::string_view> sequencePattern(std::string_view path) noexcept
 }
 
 /// The number behind the `ordinal`-th colon from the end of the last component; -1 when it is
-/// missing or no `int`.
+/// missing or no `int`. As "%d" reads it: behind white space, with a sign or without one.
 int numberBehindColon(std::string_view path, int ordinal) noexcept
 {
     std::string_view const name = lastComponent(path);
@@ -72,7 +73,10 @@ int numberBehindColon(std::string_view path, int ordinal) noexcept
             return -1;
     }
     int number = -1;
-    auto const digits = name.substr(colon + 1);
+    std::string_view digits = name.substr(colon + 1);
+    digits.remove_prefix(std::min(digits.find_first_not_of(" \t\n\v\f\r"), digits.size()));
+    if (digits.starts_with('+') && !digits.starts_with("+-"))
+        digits.remove_prefix(1);
     auto const result = std::from_chars(digits.data(), digits.data() + digits.size(), number);
     return result.ec == std::errc() ? number : -1;
 }

@@ -63,7 +63,8 @@ public:
 
     bool isSequence() const;
     /// The number behind the last colon but one, and behind the last colon, of the last path
-    /// component; -1 when there is none.
+    /// component; blanks and a sign may stand in front of it, what follows it is passed over. -1
+    /// when there is none.
     int getSequenceStart() const;
     int getSequenceEnd() const;
     /// End minus start plus 1.

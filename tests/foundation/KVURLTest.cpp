@@ -87,6 +87,7 @@ TEST(KVURL, KnowsSequences)
         {"/a/b[#x].tif", false, -1, -1},     {"/a/b#].tif", false, -1, -1},
         {"/a/b[##", false, -1, -1},          {"/a:1/b:2", false, -1, 2},
         {"/a/b[#]:x:5", true, -1, 5},        {"/a/b[#]:1:99999999999", true, 1, -1},
+        {"/a/b[#]: 1:\t+20 x", true, 1, 20}, {"/a/b[#]:-3:+-5", true, -3, -1},
     };
     for (Row const& row : rows) {
         KVURL const url(row.path);
