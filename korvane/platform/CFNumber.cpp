@@ -1,7 +1,8 @@
 #include <korvane/platform/CFNumber.h>
 
+#include <korvane/platform/KVSaturatingCast_p.h>
+
 #include <functional>
-#include <limits>
 
 double __CFNumber::doubleValue() const noexcept
 {
@@ -10,16 +11,7 @@ double __CFNumber::doubleValue() const noexcept
 
 std::int64_t __CFNumber::int64Value() const noexcept
 {
-    if (!isFloat_)
-        return integer_;
-    if (real_ != real_)
-        return 0;
-    // 2^63 is the first double above the range, -2^63 the last one within it.
-    if (real_ >= 0x1p63)
-        return std::numeric_limits<std::int64_t>::max();
-    if (real_ < -0x1p63)
-        return std::numeric_limits<std::int64_t>::min();
-    return static_cast<std::int64_t>(real_);
+    return isFloat_ ? kvSaturatingCast<std::int64_t>(real_) : integer_;
 }
 
 std::int32_t __CFNumber::intValue() const noexcept

@@ -32,15 +32,4 @@ constexpr std::int64_t quotient(std::int64_t a, std::int64_t b) noexcept
     return b == -1 && a == INT64_MIN ? INT64_MAX : a / b;
 }
 
-/// The number cut toward zero; the nearest end where it is out of range, 0 for NaN.
-constexpr std::int64_t saturated(double x) noexcept
-{
-    // 2^63 is the first double above the range, -2^63 the last one within it.
-    if (x >= 0x1p63)
-        return INT64_MAX;
-    if (x < -0x1p63)
-        return INT64_MIN;
-    return x == x ? static_cast<std::int64_t>(x) : 0;
-}
-
 } // namespace kv

@@ -1,6 +1,6 @@
 #include <korvane/serialization/KVBinaryXMLField.h>
 
-#include <korvane/foundation/KVSaturatingCast_p.h>
+#include <korvane/platform/KVSaturatingCast_p.h>
 #include <korvane/serialization/KVNumberText_p.h>
 #include <korvane/serialization/KVStreamElement.h>
 

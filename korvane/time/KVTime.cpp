@@ -2,6 +2,7 @@
 
 #include <korvane/foundation/KVPrint.h>
 #include <korvane/platform/Int128_p.h>
+#include <korvane/platform/KVSaturatingCast_p.h>
 #include <korvane/time/IntermediateLargeInteger_p.h>
 #include <korvane/time/TimeText_p.h>
 
@@ -215,8 +216,8 @@ CMTime operator/(CMTime const& time, double divisor) noexcept
             break;
         scale *= 2;
     }
-    return KV_CMTimeMultiply64Divide64(time, scale,
-                                       kv::saturated(static_cast<double>(scale) * divisor));
+    return KV_CMTimeMultiply64Divide64(
+        time, scale, kvSaturatingCast<std::int64_t>(static_cast<double>(scale) * divisor));
 }
 
 // --- Ask ---
@@ -259,7 +260,8 @@ std::int64_t KV_CMTimeGetSampleNumber(CMTime time, CMTime sampleDuration) noexce
         return kv::quotient(ticks, sampleDuration.value);
     if (isExactOn(time.timescale, sampleDuration, &ticks))
         return ticks == 0 ? 0 : kv::quotient(time.value, ticks);
-    return kv::saturated(CMTimeGetSeconds(time) / CMTimeGetSeconds(sampleDuration));
+    return kvSaturatingCast<std::int64_t>(CMTimeGetSeconds(time) /
+                                          CMTimeGetSeconds(sampleDuration));
 }
 
 CMTime KV_CMTimeFromSampleNumberAndDuration(std::int64_t number, CMTime sampleDuration) noexcept

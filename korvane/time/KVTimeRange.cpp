@@ -2,7 +2,7 @@
 
 #include <korvane/foundation/KVNSRef.h>
 #include <korvane/platform/CFNumber.h>
-#include <korvane/platform/Int128_p.h>
+#include <korvane/platform/KVSaturatingCast_p.h>
 #include <korvane/time/KVTime.h>
 
 #include <cmath>
@@ -155,7 +155,8 @@ double VexTimeToRealFrameWithRate(CMTime const& time, double rate) noexcept
 
 std::int64_t VexTimeToFrameWithRate(CMTime const& time, double rate) noexcept
 {
-    return kv::saturated(std::floor(VexTimeToRealFrameWithRate(time, rate) + 1e-7));
+    return kvSaturatingCast<std::int64_t>(
+        std::floor(VexTimeToRealFrameWithRate(time, rate) + 1e-7));
 }
 
 // --- Dictionaries ---
