@@ -48,7 +48,7 @@ def first_failure(program):
     path = next(BUILD.rglob(program))
     try:
         result = subprocess.run([str(path), "--gtest_brief=1"], capture_output=True, text=True,
-                                errors="replace", cwd=path.parent, timeout=30)
+                                errors="replace", cwd=path.parent, timeout=120)
     except subprocess.TimeoutExpired:
         return "did not end"
     failed = re.search(r"\[  FAILED  \] ([\w./]+)", result.stdout)

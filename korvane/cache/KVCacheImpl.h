@@ -38,6 +38,7 @@ struct KVNoLock {
 ///
 /// `LockPolicy` is a type with `lock` and `unlock`, held during each operation. With KVNoLock one
 /// thread at a time may use the cache, for looking up as well: a look-up moves the entry it finds.
+/// Values are copied and destroyed inside the operations: what they do then must not use the cache.
 template <class Key, class Value, class LockPolicy = KVNoLock>
 class KVCacheImpl {
 public:
@@ -56,6 +57,7 @@ public:
     using Entries = std::map<Key, Data>;
     using Heap = KVEvictionHeap<typename Entries::iterator>;
 
+    /// Empty; costs are not bounded.
     explicit KVCacheImpl(std::uint64_t maxEntries = kUnbounded) : maxEntries_(maxEntries) {}
     KVCacheImpl(KVCacheImpl const&) = delete;
     KVCacheImpl& operator=(KVCacheImpl const&) = delete;
@@ -70,8 +72,8 @@ public:
     /// Evicts until both bounds hold.
     void evictIfNecessary();
 
-    /// The bounds, `kUnbounded` for none. Setting one evicts nothing until the next `addValue` or
-    /// `evictIfNecessary`.
+    /// The bounds, inclusive, `kUnbounded` for none. Setting one evicts nothing until the next
+    /// `addValue` or `evictIfNecessary`. These and all below take no lock.
     std::uint64_t maxEntries() const noexcept { return maxEntries_; }
     std::uint64_t maxCost() const noexcept { return maxCost_; }
     void setMaxEntries(std::uint64_t count) noexcept { maxEntries_ = count; }
@@ -80,12 +82,13 @@ public:
     std::uint64_t evictionHold() const noexcept { return evictionHold_; }
     void setEvictionHold(std::uint64_t hold) noexcept { evictionHold_ = hold; }
 
+    /// The number of entries.
     std::size_t size() const noexcept { return entries_.size(); }
     /// The sum of the costs of all entries, modulo 2^64.
     std::uint64_t totalCost() const noexcept { return totalCost_; }
     /// How many touches there have been.
     std::uint64_t clock() const noexcept { return clock_; }
-    /// What is held, by key and by age, to look at. Looking touches nothing and takes no lock.
+    /// What is held, by key and by age, to look at. Looking touches nothing.
     Entries const& entries() const noexcept { return entries_; }
     Heap const& heap() const noexcept { return heap_; }
 
@@ -100,6 +103,7 @@ private:
     static void assign(Value& to, Value const& from);
     void evict() noexcept;
 
+    // Reserved: always empty.
     std::weak_ptr<void> self_;
     mutable Entries entries_;
     mutable Heap heap_;

@@ -43,7 +43,7 @@ struct KVCachedArgument<T*> {
 template <class Result, class... Args>
 class KVCachedFunctionImpl {
 public:
-    /// A negative `capacity` means no bound; with 0 every call computes.
+    /// At most `capacity` results; a negative number means no bound, with 0 every call computes.
     KVCachedFunctionImpl(std::function<Result(Args...)> function, int capacity)
         : function_(std::move(function)), cache_(static_cast<std::uint64_t>(capacity))
     {}

@@ -16,15 +16,20 @@ struct KVArray_Traits {
     static void zero(T* first, T* last) { std::fill(first, last, T()); }
 };
 
-/// A growing array whose new elements are zero. Sizes are `int`.
+/// A growing array whose new elements are zero. Sizes are `int`. KVDynamicArray is the one to
+/// insert into; `cc::vec_t` the one of look-up tables, without checks.
 ///
 ///     KVArray<float> weights;
 ///     weights.resize(3, 0);        // three zeros
 ///     weights.push(0.5f);
+///
+/// Pointers and iterators hold until the capacity changes. Allocation throws std::bad_alloc and
+/// leaves the array as it was. Not synchronised.
 template <class T, class Traits = KVArray_Traits<T>>
 class KVArray {
 public:
     KVArray() noexcept = default;
+    /// So many zeros. Throws KVIllegalArgumentException for a negative size.
     explicit KVArray(int size) { resize(size, 0); }
     KVArray(KVArray const& other)
     {
@@ -41,6 +46,7 @@ public:
 
     int size() const noexcept { return size_; }
     int capacity() const noexcept { return capacity_; }
+    /// Null as long as the capacity is 0.
     T* data() noexcept { return data_.get(); }
     T const* data() const noexcept { return data_.get(); }
     T* begin() noexcept { return data(); }
@@ -52,11 +58,12 @@ public:
     T& operator[](int index) { return data_[checked(index)]; }
     T const& operator[](int index) const { return data_[checked(index)]; }
 
-    /// Sets the size, and the capacity to the larger of the two. Elements between the old size and
-    /// a larger new one are zero; those beyond a smaller one keep what they hold as long as the
-    /// capacity stays. Throws KVIllegalArgumentException for a negative size.
+    /// Sets the size, and the capacity to the larger of the two, also where that is less than it
+    /// was. Elements between the old size and a larger new one are zero; those beyond a smaller one
+    /// keep what they hold as long as the capacity stays. Throws KVIllegalArgumentException for a
+    /// negative size.
     void resize(int size, int capacity);
-    /// Appends a copy, which may be of an element of this array.
+    /// Appends a copy, which may be of an element of this array. A full array doubles its capacity.
     void push(T const& value);
 
 private:

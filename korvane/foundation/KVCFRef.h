@@ -9,13 +9,15 @@
 ///
 ///     KVCFRef<CFDataRef> data = KVCFRef<CFDataRef>::adopt(CFDataCreate(nullptr, bytes, n));
 ///
-/// It converts to `T` by itself, so it can be handed to whatever takes the plain reference. Not
+/// It converts to `T` by itself, so it can be handed to whatever takes the plain reference, and to
+/// the holder of a base class. Object kinds are held by KVNSRef, the same under another name. Not
 /// synchronised: a holder belongs to one thread, the object need not.
 template <class T>
 class KVCFRef {
     static_assert(std::is_pointer_v<T>);
 
 public:
+    /// No reference, as from `nullptr`.
     constexpr KVCFRef() noexcept = default;
     constexpr KVCFRef(std::nullptr_t) noexcept {}
     /// Retains. Use `adopt` for a reference that the caller already owns.
@@ -43,6 +45,7 @@ public:
         return *this;
     }
 
+    /// Unowned; null when there is none.
     T get() const noexcept { return object_; }
     operator T() const noexcept { return object_; }
     T operator->() const noexcept { return object_; }

@@ -6,11 +6,18 @@
 #include <limits>
 #include <memory>
 #include <new>
+#include <utility>
 #include <vector>
 
-/// An array to insert into, which grows by doubling. It must be given a positive capacity
-/// when it is made: twice nothing is nothing, and inserting one value into an array of
-/// capacity 0 throws KVAssertionException.
+/// An array to insert into, which grows by doubling. Sizes are `unsigned int`.
+///
+///     KVDynamicArray<int> order(4);     // empty, with room for four
+///     order.insert(0, 7);               // 7
+///     order.insert(0, 5);               // 5 7
+///
+/// It must be given a positive capacity when it is made: twice nothing is nothing, and inserting
+/// one value into an array of capacity 0 throws KVAssertionException. Pointers and iterators hold
+/// until something is inserted. Not synchronised.
 template <class T>
 class KVDynamicArray {
 public:
@@ -22,6 +29,11 @@ public:
         std::copy(other.begin(), other.end(), data_.get());
         size_ = other.size_;
     }
+    KVDynamicArray(KVDynamicArray&& other) noexcept
+        : size_(std::exchange(other.size_, 0)),
+          capacity_(std::exchange(other.capacity_, 0)),
+          data_(std::move(other.data_))
+    {}
     KVDynamicArray& operator=(KVDynamicArray other) noexcept
     {
         std::swap(size_, other.size_);
@@ -41,7 +53,8 @@ public:
     T const& operator[](unsigned int index) const { return data_[checked(index)]; }
 
     /// Puts a copy in front of element `index`, or at the end. Returns whether the array had to
-    /// grow. Throws KVBadIndexException for an index beyond the end.
+    /// grow. Throws KVBadIndexException for an index beyond the end, std::bad_alloc when there is
+    /// no memory.
     bool insert(unsigned int index, T const& value)
     {
         if (capacity_ == 0)
@@ -61,7 +74,8 @@ private:
     unsigned int checked(unsigned int index) const
     {
         if (index >= size_)
-            throw KVBadIndexException("KVDynamicArray");
+            throw KVBadIndexException(
+                KVString::ssprintf("KVDynamicArray index %u of %u", index, size_));
         return index;
     }
 

@@ -27,8 +27,10 @@ public:
 
     /// `getInfo()` as UTF-8, made at the first call; valid as long as the exception.
     char const* what() const noexcept override;
+    /// The name that `getInfo` begins with.
     virtual KVString className() const;
-    /// Unowned; null unless `addCallStackSymbols` was called.
+    /// The kept stack, innermost frame first; unowned, valid as long as the exception. Null unless
+    /// `addCallStackSymbols` was called.
     virtual CFArrayRef callStackSymbols() const;
     /// Writes `getInfo()` and a newline to standard error.
     virtual void report() const;
@@ -108,7 +110,8 @@ KV_DECLARE_UNNAMED_EXCEPTION(KVException_AttributeUndefined);
 /// Bytes could not be written.
 KV_DECLARE_UNNAMED_EXCEPTION(KVException_WriteError);
 
-/// One process-wide switch, off at the start: whether hosts may abort a render by throwing.
+/// One process-wide switch, off at the start: whether hosts may abort a render by throwing. The
+/// library itself does not ask it. May be used from any thread.
 class KV_EXPORT KVRenderAbortedException {
 public:
     static void setEnableAbortRender(bool enable) noexcept;

@@ -10,11 +10,15 @@
 ///
 ///     KVMutex mutex;
 ///     std::scoped_lock const lock(mutex);
+///
+/// The thread that took it gives it back; nobody may hold it when it is destroyed. An ordinary lock
+/// that its owner asks for again waits for ever.
 class KV_EXPORT KVMutex {
 public:
     /// An ordinary lock. Throws KVSystemException if the system has no more.
     KVMutex();
-    /// True makes a lock that its owner may take again; each `lock` needs its `unlock`.
+    /// True makes a lock that its owner may take again; each `lock` needs its `unlock`. Throws as
+    /// above.
     explicit KVMutex(bool recursive);
     KVMutex(KVMutex const&) = delete;
     KVMutex& operator=(KVMutex const&) = delete;
@@ -30,6 +34,10 @@ private:
 };
 
 /// Lets threads wait until another one tells them to look again.
+///
+///     std::scoped_lock const lock(mutex);
+///     while (queue.empty())
+///         filled.wait(&mutex);       // another thread adds under the lock, then calls signal()
 class KV_EXPORT KVConditionVariable {
 public:
     KVConditionVariable() noexcept;

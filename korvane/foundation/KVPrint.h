@@ -6,12 +6,14 @@
 #include <cstddef>
 
 // Diagnostics. KVPrint speaks to whoever runs the program; the log speaks to the
-// system, and its latest line is kept where a crash report would find it.
+// system, and its latest line is kept where a crash report would find it. All may
+// be called from any thread.
 
 /// Prints to standard output. If the environment variable `kvPrintUseLogFile` is set (to anything)
 /// at the first call of the process, all goes to the file "/tmp/output.<pid>.log" instead, flushed
 /// after each message; while that file cannot be opened, messages are dropped.
 KV_EXPORT void KVPrint(char const* format, ...) KV_PRINTF(1, 2);
+/// The same for arguments that are at hand as a list.
 KV_EXPORT void KVPrintVA(char const* format, std::va_list arguments);
 /// Prints two blanks for each level of `depth`, then the message.
 KV_EXPORT void KVPrintIndent(unsigned int depth, char const* format, ...) KV_PRINTF(2, 3);
@@ -24,6 +26,7 @@ KV_EXPORT void KVPrintStackStop();
 /// 1023 bytes reach. Allocates nothing.
 KV_EXPORT void _KVLogMessage(char const* file, unsigned int line, char const* format, ...)
     KV_PRINTF(3, 4);
+/// The same for arguments that are at hand as a list.
 KV_EXPORT void _KVLogMessageInternal(char const* file, unsigned int line, char const* format,
                                      std::va_list arguments);
 /// Logs a text with "%@" for objects, as `KVString::sprintf` forms it; a null format does nothing.
@@ -37,7 +40,7 @@ using KVLogSink = void (*)(char const* line, std::size_t length);
 KV_EXPORT void KVSetLogSink(KVLogSink sink) noexcept;
 
 /// Keeps `text` behind the prefix "Last Korvane Log: " in a static buffer of 1124 bytes, in place
-/// of the text before. Allocates nothing.
+/// of the text before. Allocates nothing. Of two threads that log at once the texts may mix there.
 KV_EXPORT void _KVSetCrashReporterMessage(char const* text);
 /// That buffer, zero-terminated, for crash handlers.
 extern "C" KV_EXPORT char const* KVCrashReporterBuffer() noexcept;
@@ -62,6 +65,7 @@ public:
 
 /// Sets the test case that is running, null for none; call it on the main thread. Not owned.
 KV_EXPORT void _KVUnitTesting_SetCurrentCase(KVUnitTestCase* testCase);
+/// Gives a failure to the test case that is running; logs it where there is none.
 KV_EXPORT void _KVUnitTesting_HandleAssertionFailure(char const* file, unsigned int line,
                                                      KVString const& message);
 

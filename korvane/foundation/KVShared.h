@@ -89,7 +89,8 @@ private:
     bool disposedByBlock_ = false;
 };
 
-/// Holds a strong reference to a `T` derived from KVShared_base, or none.
+/// Holds a strong reference to a `T` derived from KVShared_base, or none. Not synchronised: a
+/// holder belongs to one thread, the object need not. So does a KVWeak.
 template <class T>
 class KVShared {
 public:
@@ -101,6 +102,7 @@ public:
         result.object_ = object;
         return result;
     }
+    /// Makes an object and the holder of its first reference in one step.
     template <class... Arguments>
     static KVShared make(Arguments&&... arguments)
     {
@@ -125,6 +127,7 @@ public:
             object_->sharedBlock()->release();
     }
 
+    /// Unowned; null when there is none.
     T* get() const noexcept { return object_; }
     T* operator->() const noexcept { return object_; }
     T& operator*() const noexcept { return *object_; }

@@ -7,9 +7,13 @@
 #include <vector>
 
 /// A reader-writer lock, recursive on both sides: a writer may take it again on either side, a
-/// reader may read again. It is a SharedLockable, so `std::shared_lock` holds it.
+/// reader may read again. `std::scoped_lock` holds it to write, `std::shared_lock` to read.
 ///
-/// A reader must not ask for `lock`: it would wait for itself, for ever.
+///     KVSharedMutex mutex;
+///     std::shared_lock const reading(mutex);
+///
+/// A writer that waits keeps new readers out. A reader must not ask for `lock`: it would wait for
+/// itself, for ever. Who waits keeps looking, so sections should be short.
 class KV_EXPORT KVSharedMutex {
 public:
     KVSharedMutex() = default;
@@ -20,7 +24,7 @@ public:
     void lock();
     /// Undoes one `lock` of the writer. Only the writer may call it: this is not checked.
     void unlock();
-    /// Waits for the writer to leave.
+    /// Waits for the writer to leave. Throws std::bad_alloc, with nothing taken.
     void lock_shared();
     /// Undoes one `lock_shared`. On a thread that holds nothing it changes nothing.
     void unlock_shared();

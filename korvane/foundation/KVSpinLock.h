@@ -8,6 +8,9 @@
 /// A lock of four bytes for short critical sections: unfair, without an owner, not recursive. A
 /// thread that finds it taken spins for a moment and then sleeps, so that a long section costs
 /// waiting threads no processor time.
+///
+///     KVSpinLock lock;
+///     std::scoped_lock const held(lock);
 class KV_EXPORT KVSpinLock {
 public:
     constexpr KVSpinLock() noexcept = default;
@@ -15,6 +18,7 @@ public:
     KVSpinLock& operator=(KVSpinLock const&) = delete;
 
     void lock() noexcept;
+    /// Takes it if it is free, and answers whether it did.
     bool try_lock() noexcept;
     void unlock() noexcept;
 

@@ -13,7 +13,8 @@
 /// address (0x and 16 digits), the symbol, " + " and the distance of the frame from it in bytes.
 class KV_EXPORT KVStackTrace {
 public:
-    /// Keeps up to `count` lines; 0 keeps all of the five innermost frames that are not left out.
+    /// Keeps up to `count` lines out of the `count + 5` innermost frames. Meant so: 0, and a count
+    /// below it, keeps all of those frames that are not left out.
     explicit KVStackTrace(int count);
 
     /// Writes each line behind two blanks.

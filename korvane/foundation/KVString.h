@@ -38,6 +38,7 @@ public:
     KVString(std::nullptr_t) : KVString("") {}
     /// From zero-terminated UTF-8; null or empty text gives the empty string, not the null one.
     KVString(char const* utf8);
+    /// From all bytes of UTF-8; an empty text gives the empty string.
     KVString(std::string const& utf8);
     /// From zero-terminated UTF-16; null gives the null string.
     KVString(unsigned short const* utf16);
@@ -61,6 +62,7 @@ public:
     static KVString adopt(CFStringRef string) noexcept;
     /// From UTF-8 that need not be terminated.
     static KVString fromUTF8(std::string_view utf8);
+    /// From UTF-16 that need not be terminated; half a surrogate pair is kept.
     static KVString fromUTF16(std::u16string_view units);
 
     void set(KVString const& other) noexcept { text_ = other.text_; }
@@ -91,6 +93,7 @@ public:
     NSString* ns_str() const noexcept { return cf_str(); }
     /// The units with a terminating zero, valid while this text is held; null for the null string.
     char16_t const* u_str() const noexcept { return text_ ? text_->units() : nullptr; }
+    /// The units, valid while this text is held; none for the null string.
     std::u16string_view view() const noexcept
     {
         return text_ ? text_->view() : std::u16string_view();
@@ -101,7 +104,7 @@ public:
     char* createUTF8Str() const;
     /// `malloc`ed UTF-16 with a terminator, which the caller frees; null for the null string.
     unsigned short* createUniStr() const;
-    /// UTF-8.
+    /// UTF-8; a null string gives an empty text.
     std::string toUTF8() const { return CFStringGetUTF8(text_); }
     operator std::string() const { return toUTF8(); }
 
@@ -176,7 +179,10 @@ public:
     KVString toUpper() const;
     KVString toLower() const;
     KVString toCapitalize() const;
+    /// Decomposed (NFD), without nonspacing marks, composed again (NFC): "Réel" gives "Reel".
     KVString stringWithoutDiacritics() const;
+    /// Without any unit that is of the classes of `isWhitespace` or `isNewline`, wherever it
+    /// stands.
     KVString stringWithoutSpacesAndNewlines() const;
 
     // --- Format ---
@@ -202,7 +208,8 @@ public:
     unsigned int composedCharacterCount() const;
     /// The same count: shaping, which could join them, is not part of a string.
     unsigned int glyphCount() const;
-    /// Whether every unit is of the class; true for an empty string.
+    /// Whether every unit is of the class; true for an empty or null string. Whitespace is the tab
+    /// and the category Zs, a newline is U+000A to U+000D, U+0085, U+2028 or U+2029.
     bool isWhitespace() const noexcept;
     bool isWhitespaceAndNewline() const noexcept;
     bool isNewline() const noexcept;

@@ -9,7 +9,9 @@
 ///     KVThread worker(&run, &job, "decode");
 ///     worker.wait();
 ///
-/// `wait` or `detach` once; a handle that goes while its thread is attached detaches it.
+/// `wait` or `detach` once: what is called on the handle after that does nothing. A handle that
+/// goes while its thread is attached detaches it. Both, and the end of a handle, belong to one
+/// thread; the rest may be called from any. An exception that leaves the function ends the process.
 class KV_EXPORT KVThread {
 public:
     /// The system's thread, by the name that the standard library has for it.
@@ -34,8 +36,10 @@ public:
     bool isSelf() const noexcept { return thread_ == self(); }
     bool operator==(KVThread const& other) const noexcept { return thread_ == other.thread_; }
 
-    /// Runs `function(argument, index, count)` once for each index from 0, on as many threads as
-    /// there are processors, and waits for all of them. The function must not throw.
+    /// Runs `function(argument, index, count)` once for each index from 0 up to `count`, exclusive,
+    /// and waits for all of them. `count` is that of the processors (`KVInfo_ProcessorCount`); each
+    /// index has a thread of its own or, where none could be started, the calling one. The function
+    /// must not throw.
     static void KVFork(void (*function)(void*, int, int), void* argument);
 
 private:

@@ -5,7 +5,8 @@
 #include <compare>
 #include <cstdint>
 
-/// 128 bits as four 32-bit words, the first one in front when written.
+/// 128 bits as four 32-bit words, the first one in front when written. A plain record: making a
+/// new, unique one is left to the host. Documents print it as 32 lower-case digits without dashes.
 struct KV_EXPORT KVUUID {
     std::uint32_t words[4] = {0, 0, 0, 0};
 

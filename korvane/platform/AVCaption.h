@@ -3,7 +3,9 @@
 #include <korvane/platform/CMTimeRange.h>
 #include <korvane/platform/NSAttributedString.h>
 
-/// Where a caption stands on the picture, and how text moves in there. Immutable.
+/// Where a caption stands on the picture, and how text moves in there. Immutable. What a `scroll`
+/// of a region and an `animation` of a caption mean is up to who sets them: they are carried as
+/// they are, and 0 is none.
 ///
 /// Three kinds: the bottom of the picture, as SubRip text has it; a place in the cell grid of
 /// line-21 captions (32 columns, 15 rows); a region that a timed-text document defines under a
@@ -13,14 +15,16 @@ public:
     enum class Kind { subRip, cells, identifier };
 
     static KVNSRef<AVCaptionRegion*> subRipTextBottomRegion();
-    /// `height` rows of cells with the upper left one at column `cellX`, row `cellY`.
+    /// `height` rows of cells with the upper left one at column `cellX`, row `cellY`. Not checked
+    /// against the grid.
     static KVNSRef<AVCaptionRegion*> regionWithCells(long long cellX, long long cellY,
                                                      long long height, long long scroll);
     static KVNSRef<AVCaptionRegion*> regionWithIdentifier(KVString const& identifier);
 
     Kind kind() const noexcept { return kind_; }
-    /// "subRipTextBottom", empty, or the region's name.
+    /// By kind: "subRipTextBottom", the empty string, or the region's name.
     KVString const& identifier() const noexcept { return identifier_; }
+    /// In cells; 0 but for the kind `cells`.
     long long cellX() const noexcept { return cellX_; }
     long long cellY() const noexcept { return cellY_; }
     long long height() const noexcept { return height_; }
@@ -71,6 +75,7 @@ public:
 
     AVCaption(KVString const& text, CMTimeRange const& timeRange);
 
+    /// Never the null string.
     KVString const& text() const noexcept { return attributedString_->string(); }
     CMTimeRange const& timeRange() const noexcept { return timeRange_; }
 
@@ -79,8 +84,9 @@ public:
     /// Takes over the attributes of a string with the same text; one with another text is ignored.
     void setAttributes(NSAttributedString const* styled);
 
-    /// Null when there is none.
+    /// Unowned; null when there is none.
     AVCaptionRegion const* region() const noexcept { return region_; }
+    /// Retains; null for none.
     void setRegion(AVCaptionRegion const* region) { region_ = region; }
     long long animation() const noexcept { return animation_; }
     void setAnimation(long long animation) noexcept { animation_ = animation; }

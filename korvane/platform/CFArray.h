@@ -5,8 +5,11 @@
 #include <span>
 #include <vector>
 
-/// An immutable row of objects, each retained. Elements are not null: NSNull stands
-/// for a missing one.
+/// An immutable row of objects, each retained. Elements are not null: NSNull stands for a missing
+/// one.
+///
+///     NSObject const* const pair[] = {first, second};
+///     auto const array = KVMakeRef<NSArray>(pair);
 struct KV_EXPORT __CFArray final : NSObject {
     __CFArray() = default;
     /// Retains each object; nulls become NSNull.
@@ -18,6 +21,7 @@ struct KV_EXPORT __CFArray final : NSObject {
     std::size_t count() const noexcept { return objects_.size(); }
     /// Unowned; null when the index is out of range.
     NSObject const* objectAtIndex(std::size_t index) const noexcept;
+    /// All of them, unowned, valid as long as the array.
     std::span<NSObject const* const> objects() const noexcept { return objects_; }
 
     /// Equal length and equal elements.

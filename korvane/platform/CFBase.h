@@ -18,11 +18,6 @@ using UniChar = char16_t;
 using CFAllocatorRef = void const*;
 inline constexpr CFAllocatorRef kCFAllocatorDefault = nullptr;
 
-struct CFRange {
-    CFIndex location;
-    CFIndex length;
-};
-
 enum CFComparisonResult : int {
     kCFCompareLessThan = -1,
     kCFCompareEqualTo = 0,
@@ -51,11 +46,13 @@ inline bool CFEqual(CFTypeRef a, CFTypeRef b)
     return a == b || (a && b && a->isEqual(b));
 }
 
+/// The object's `hash`; 0 for null.
 inline CFHashCode CFHash(CFTypeRef object)
 {
     return object ? object->hash() : 0;
 }
 
+/// The same as CFRetain and CFRelease, by the names that object kinds are known under.
 template <class T>
 T objc_retain(T object) noexcept
 {

@@ -10,6 +10,7 @@ using CFBundleRef = __CFBundle*;
 
 /// Unowned; always null.
 KV_EXPORT CFBundleRef CFBundleGetBundleWithIdentifier(CFStringRef identifier) noexcept;
-/// `value` if it is not null, else the key; the caller owns the result. Null for a null key.
+/// `value` if it is not null, else the key, retained: the caller owns the result. Null when both
+/// are.
 KV_EXPORT CFStringRef CFBundleCopyLocalizedString(CFBundleRef, CFStringRef key, CFStringRef value,
                                                   CFStringRef table) noexcept;

@@ -9,6 +9,11 @@
 
 /// Objects under string keys, kept in the order in which their keys first came. A
 /// `CFDictionaryRef` is read only, a `CFMutableDictionaryRef` can be changed.
+///
+///     auto const details = KVMakeRef<NSMutableDictionary>();
+///     details->setValue("frame", KVMakeRef<NSNumber>(24));
+///
+/// Keys are told apart unit by unit and are not null.
 struct KV_EXPORT __CFDictionary final : NSObject {
     __CFDictionary() = default;
     /// Shares the values, retained.
@@ -20,6 +25,7 @@ struct KV_EXPORT __CFDictionary final : NSObject {
     /// Unowned; null when there is no such key.
     NSObject const* value(CFStringRef key) const noexcept;
     NSObject const* value(std::string_view asciiKey) const noexcept;
+    /// Unowned, in order; the index must be below `count()`.
     CFStringRef keyAtIndex(std::size_t index) const noexcept { return entries_[index].first; }
     NSObject const* valueAtIndex(std::size_t index) const noexcept
     {
@@ -55,12 +61,18 @@ using CFMutableDictionaryRef = __CFDictionary*;
 using NSDictionary = __CFDictionary;
 using NSMutableDictionary = __CFDictionary;
 
+// A null dictionary reads as an empty one and copies to null; to be changed, there must be one.
+
+/// Empty; `capacity` is a hint and takes no memory.
 KV_EXPORT CFMutableDictionaryRef CFDictionaryCreateMutable(CFAllocatorRef, CFIndex capacity);
+/// A dictionary of its own, which shares the values.
 KV_EXPORT CFDictionaryRef CFDictionaryCreateCopy(CFAllocatorRef, CFDictionaryRef);
 KV_EXPORT CFMutableDictionaryRef CFDictionaryCreateMutableCopy(CFAllocatorRef, CFIndex capacity,
                                                                CFDictionaryRef);
 KV_EXPORT CFIndex CFDictionaryGetCount(CFDictionaryRef) noexcept;
+/// Unowned; null when there is no such key.
 KV_EXPORT CFTypeRef CFDictionaryGetValue(CFDictionaryRef, CFStringRef key) noexcept;
 KV_EXPORT bool CFDictionaryContainsKey(CFDictionaryRef, CFStringRef key) noexcept;
+/// Retains both. A key that is there keeps its place. A null value removes the key.
 KV_EXPORT void CFDictionarySetValue(CFMutableDictionaryRef, CFStringRef key, CFTypeRef value);
 KV_EXPORT void CFDictionaryRemoveValue(CFMutableDictionaryRef, CFStringRef key);

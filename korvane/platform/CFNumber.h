@@ -3,6 +3,9 @@
 #include <korvane/platform/CFBase.h>
 
 /// An immutable number: a 64-bit signed integer or a `double`.
+///
+///     auto const rate = KVMakeRef<NSNumber>(23.976);
+///     rate->int64Value();                   // 23
 struct KV_EXPORT __CFNumber final : NSObject {
     explicit __CFNumber(int value) noexcept : integer_(value) {}
     explicit __CFNumber(unsigned int value) noexcept : integer_(value) {}
@@ -18,9 +21,10 @@ struct KV_EXPORT __CFNumber final : NSObject {
     std::int64_t int64Value() const noexcept;
     /// The low 32 bits of `int64Value()`.
     std::int32_t intValue() const noexcept;
+    /// Whether it is other than 0, as NaN is.
     bool boolValue() const noexcept;
 
-    /// By value, whatever the form: 1 equals 1.0.
+    /// By value, whatever the form: 1 equals 1.0. NaN equals no number.
     bool isEqual(NSObject const* other) const override;
     std::size_t hash() const override;
     /// The shortest decimal text that reads back as the same number: "1", "0.5".

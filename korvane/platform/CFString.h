@@ -9,8 +9,9 @@
 /// remembers whether all units are below 0x80, so that such a text goes to and from UTF-8
 /// without conversion. Hosts use KVString; this is the reference that it holds.
 struct KV_EXPORT __CFString final : NSObject {
+    /// A copy of the units, which the caller owns.
     static __CFString const* create(std::u16string_view units);
-    /// From bytes that are all below 0x80 (not checked).
+    /// The same from bytes that are all below 0x80 (not checked).
     static __CFString const* createASCII(std::string_view bytes);
 
     /// In UTF-16 units.
@@ -18,8 +19,10 @@ struct KV_EXPORT __CFString final : NSObject {
     bool isASCII() const noexcept { return ascii_; }
     /// The units, with a zero behind the last one; valid as long as the string.
     char16_t const* units() const noexcept { return reinterpret_cast<char16_t const*>(this + 1); }
+    /// The same, valid as long as the string.
     std::u16string_view view() const noexcept { return {units(), length_}; }
 
+    /// Unit by unit.
     bool isEqual(NSObject const* other) const override;
     std::size_t hash() const override;
     KVString description() const override;
@@ -59,10 +62,11 @@ KV_EXPORT CFStringRef CFStringCreateWithCString(CFAllocatorRef, char const* text
                                                 CFStringEncoding encoding);
 /// The one empty string; owned by the library.
 KV_EXPORT CFStringRef CFStringGetEmpty() noexcept;
+/// In UTF-16 units; 0 for null.
 KV_EXPORT CFIndex CFStringGetLength(CFStringRef) noexcept;
 
-/// The text as UTF-8. A surrogate without its partner becomes U+FFFD, so the result is always valid
-/// and never has fewer bytes than the string has units.
+/// The text as UTF-8, empty for null. A surrogate without its partner becomes U+FFFD, so the result
+/// is always valid and never has fewer bytes than the string has units.
 KV_EXPORT std::string CFStringGetUTF8(CFStringRef);
 /// The most bytes that UTF-8 needs for `units` UTF-16 units.
 inline constexpr std::size_t CFStringGetMaximumUTF8Length(std::size_t units) noexcept
@@ -76,7 +80,8 @@ KV_EXPORT std::size_t CFStringEncodeUTF8(std::u16string_view units, char* out) n
 KV_EXPORT bool CFStringIsWellFormed(std::u16string_view units) noexcept;
 
 /// Order by the root collation of the Unicode Collation Algorithm (UTS #10), whatever the user's
-/// locale: by base letter, accent and, unless kCFCompareCaseInsensitive is given, case.
+/// locale: by base letter, accent and, unless kCFCompareCaseInsensitive is given, case. `flags` are
+/// CFStringCompareFlags; kCFCompareLocalized changes nothing.
 KV_EXPORT CFComparisonResult CFStringCompareUnits(std::u16string_view, std::u16string_view,
                                                   std::uint32_t flags);
 
@@ -92,8 +97,9 @@ KV_EXPORT std::size_t CFStringGetGraphemeCount(CFStringRef);
 /// at or before it, is where they are counted from.
 KV_EXPORT std::size_t CFStringGetGraphemeBoundary(std::u16string_view units, std::size_t start,
                                                   std::size_t index);
-/// Zs or the tab; U+000A to U+000D, U+0085, U+2028, U+2029.
+/// Whether a unit is the tab or of the category Zs.
 KV_EXPORT bool CFCharacterIsWhitespace(char16_t) noexcept;
+/// Whether a unit is U+000A to U+000D, U+0085, U+2028 or U+2029.
 KV_EXPORT bool CFCharacterIsNewline(char16_t) noexcept;
 /// One character of Mac OS Roman, a bijection of 256 bytes onto the BMP.
 KV_EXPORT char16_t CFCharacterFromMacRoman(std::uint8_t) noexcept;

@@ -13,10 +13,12 @@ struct KV_EXPORT __CFURL final : NSObject {
     __CFURL(__CFURL const&) = delete;
     __CFURL& operator=(__CFURL const&) = delete;
 
+    /// Unowned; percent-encoded.
     CFStringRef absoluteString() const noexcept { return absolute_; }
     /// Whether the path ends in "/".
     bool hasDirectoryPath() const noexcept;
 
+    /// By the text, unit by unit.
     bool isEqual(NSObject const* other) const override;
     std::size_t hash() const override;
     KVString description() const override;
@@ -34,6 +36,7 @@ KV_EXPORT CFURLRef CFURLCreateFromFileSystemRepresentation(CFAllocatorRef, void 
 /// From URL text, taken as it stands; null for null or empty text. `base` is not used: the text is
 /// absolute.
 KV_EXPORT CFURLRef CFURLCreateWithString(CFAllocatorRef, CFStringRef text, CFURLRef base);
+/// Unowned; null for null.
 KV_EXPORT CFStringRef CFURLGetString(CFURLRef) noexcept;
 /// The decoded POSIX path in UTF-8, without the "/" that marks a directory unless it is the root;
 /// empty for null.

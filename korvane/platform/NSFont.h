@@ -31,7 +31,7 @@ public:
     double pointSize() const noexcept { return pointSize_; }
     bool isBold() const noexcept { return bold_; }
     bool isItalic() const noexcept { return italic_; }
-    /// The same size with these traits.
+    /// The same size with these traits, bold and italic both set anew.
     KVNSRef<NSFont const*> withTraits(bool bold, bool italic) const;
 
     bool isEqual(NSObject const* other) const override;

@@ -18,7 +18,8 @@ class KVString;
 ///
 /// An object may also live on the stack or inside another one, as long as nobody
 /// releases a reference that was not retained. The count may be used from any
-/// thread; all else is up to the derived class.
+/// thread; all else is up to the derived class, where an immutable object may be
+/// read by any number of threads and one that can be changed belongs to one.
 class KV_EXPORT NSObject {
 public:
     NSObject() noexcept = default;

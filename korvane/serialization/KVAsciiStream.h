@@ -23,7 +23,8 @@
 /// and the text begins with a header of 12 characters, which stand for 9 bytes: the number of
 /// bytes as a big-endian 64-bit value, and "*". The last group is filled up with zero bytes.
 ///
-/// A stream is written to or read from, as the first `write` or `open` decides, until `clear`.
+/// A stream is written to or read from, as the first `write` or `open` decides, until `clear`. It
+/// belongs to one thread.
 class KV_EXPORT KVAsciiStream {
 public:
     KVAsciiStream() = default;
@@ -32,14 +33,17 @@ public:
     /// than 12 characters or none, with "Magic Number does not match" when the header does not
     /// end in "*". A number of bytes that the text is too short for becomes what it has room for.
     bool open(char const* text);
+    /// The same for so many characters, which need not be terminated.
     bool open(char const* text, unsigned long long length);
-    /// The smaller of `length` and what is left. A character outside the 64 reads as value 0.
+    /// Returns how many bytes came, the smaller of `length` and what is left. A character outside
+    /// the 64 reads as value 0.
     long long read(void* data, unsigned long long length);
     /// Returns `length`; 0 when the stream is being read or has been closed.
     long long write(void const* data, unsigned long long length);
-    /// Ends writing: writes the last group and the header.
+    /// Ends writing: writes the last group and the header, also for no bytes at all. Does nothing
+    /// when the stream is being read or has been closed.
     void close();
-    /// Forgets everything.
+    /// Forgets everything: the stream may be written to or read from anew.
     void clear();
 
     /// The text. Its header holds the number of bytes when the stream is closed, 0 before.

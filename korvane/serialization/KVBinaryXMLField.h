@@ -60,7 +60,7 @@ public:
     /// Whether the number is not zero. A string out of range counts as a number that is not.
     bool getAsBool(bool* value) const;
     /// From a UUID, or a string that `KVStreamElement::atoUUID` reads: a new one, which the caller
-    /// owns. Otherwise null.
+    /// deletes. Otherwise null.
     KVUUID* getAsUUID() const;
     /// From a time, or a string that `KVStreamElement::aToVexTime` reads. Otherwise false.
     bool getAsVexTime(CMTime* value) const;

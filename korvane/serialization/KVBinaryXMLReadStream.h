@@ -45,14 +45,15 @@ public:
     /// -1 for a failure and after `abortParse`. Elements that a failure left open stay on the
     /// stack.
     int parseElement();
-    /// Both take effect when the next element starts. Called from the `parseElement` of an element
-    /// that has children, that is the one behind its first child's start.
+    /// Both take effect when an element is about to start. The `parseElement` of an element with
+    /// children is called as its first child starts: that child is still opened and, unless it has
+    /// children of its own, told; no further one is.
     void abortParse() override;
     void stopParse() override;
     /// Goes to the end of the current element.
     void ignoreElement() override;
 
-    /// The place of the file that is read; a null URL when it is no file.
+    /// The place of the file that is read; a null URL when the byte stream is no KVFileReadStream.
     KVURL const& getURL() const noexcept;
 
     // --- Decoders: false when the stream ends too early ---

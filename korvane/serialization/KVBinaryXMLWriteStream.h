@@ -23,6 +23,8 @@ class KVStream;
 ///
 /// - of several values in one element a reader gives the last;
 /// - whole-number floats become integers, so -0.0 comes back as 0;
+/// - a `long long`, or a whole `float` or `double`, from -(2^32 - 1) to -(2^31 + 1) comes back
+///   2^32 larger: readers cut a negative integer of up to four bytes to an `int`;
 /// - an attribute that is an empty string is not counted, so that readers take its bytes for the
 ///   start of the body, or it is lost if it is the only one: leave it out;
 /// - an attribute written after a value or a child of its element is lost;
@@ -72,7 +74,8 @@ public:
     void writeArray(double* values, unsigned int count) override;
     void writeBlankLine() override;
 
-    /// The place of the file that is written; a null URL when it is no file.
+    /// The place of the file that is written; a null URL when the byte stream is no
+    /// KVFileWriteStream.
     KVURL const& getURL() const noexcept;
 
     // --- Encoders ---

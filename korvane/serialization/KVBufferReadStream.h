@@ -17,7 +17,7 @@ public:
     KVBufferReadStream(void const* bytes, unsigned long long length);
     ~KVBufferReadStream() override;
 
-    /// The smaller of `length` and what is left.
+    /// Returns how many bytes came, the smaller of `length` and what is left.
     long long read(void* data, unsigned long long length) override;
     /// Nothing is written: 0.
     long long write(void const* data, unsigned long long length) override;

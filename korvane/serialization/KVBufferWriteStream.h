@@ -41,6 +41,7 @@ public:
     unsigned long long getBufferSize() const noexcept { return size_; }
     /// A `malloc`ed copy of the data, which the caller frees; null when there is no memory.
     void* copyBuffer() const;
+    /// The same as a block. Throws std::bad_alloc when there is no memory.
     KVCFRef<CFDataRef> copyData() const;
 
 private:

@@ -14,21 +14,23 @@
 ///     stream.writeUInt16(600);       // 0x02, 0x58
 ///
 /// All but `writeBits` start at a whole byte: bits that are pending are filled up with zeros and
-/// written first.
+/// written first. A stream belongs to one thread.
 class KV_EXPORT KVByteWriteStream {
 public:
     KVByteWriteStream() = default;
     virtual ~KVByteWriteStream();
 
+    /// The low 8, 16 or 32 bits.
     void writeUInt8(unsigned int value);
     void writeUInt16(unsigned int value);
     void writeUInt32(unsigned int value);
+    /// Copies the bytes.
     void writeData(unsigned char const* data, unsigned int length);
     /// Appends all bytes of the other stream (which may be this one), whose pending bits are
     /// flushed first.
     virtual void writeStream(KVByteWriteStream& other);
-    /// Overwrites the four bytes at `position`, which must have been written. Throws
-    /// KVBadIndexException if they have not.
+    /// Overwrites the four bytes at `position`, counted from the start. Throws KVBadIndexException
+    /// unless all of them have been written.
     void writeValueAtPos(unsigned int value, unsigned int position);
 
     /// The low `count` bits of `value`, at most 32.
@@ -38,6 +40,7 @@ public:
     /// Appends the current byte as it stands and starts a new one.
     virtual void writeCurByte();
 
+    /// Valid until the next byte is written.
     unsigned char const* data() const noexcept { return bytes_.data(); }
     /// Whole bytes; pending bits do not count.
     std::size_t size() const noexcept { return bytes_.size(); }

@@ -28,7 +28,9 @@ struct KVFileReadStream::File {
     KVFileDescriptor descriptor;
     int error;
     unsigned long long position = 0;
-    // The bytes in front of the descriptor's own offset; those up to `used` have been read.
+    // Where the descriptor stands. The window holds the bytes in front of that; those up to `used`
+    // have been read.
+    unsigned long long offset = 0;
     std::unique_ptr<unsigned char[]> const window;
     unsigned long long used = 0;
     unsigned long long filled = 0;
@@ -53,12 +55,14 @@ long long KVFileReadStream::File::read(unsigned char* data, unsigned long long l
         unsigned long long got = 0;
         if (left >= capacity) {
             failure = descriptor.read(data + count, left, &got);
+            offset += got;
             // What the window holds no longer lies in front of the descriptor's offset.
             used = 0;
             filled = 0;
         } else {
             used = 0;
             failure = descriptor.read(window.get(), capacity, &filled);
+            offset += filled;
             got = takeFromWindow(data + count, left);
         }
         count += got;
@@ -71,13 +75,15 @@ long long KVFileReadStream::File::read(unsigned char* data, unsigned long long l
 
 void KVFileReadStream::File::setPosition(unsigned long long target)
 {
-    unsigned long long const windowStart = position - used;
+    // Not from `position`, which a failure has lowered.
+    unsigned long long const windowStart = offset - filled;
     if (target >= windowStart && target - windowStart <= filled) {
         used = target - windowStart;
     } else if (int const failure = descriptor.seek(target)) {
         keep(failure);
         return;
     } else {
+        offset = target;
         used = 0;
         filled = 0;
     }

@@ -15,14 +15,15 @@ public:
     explicit KVFileReadStream(KVURL const& url);
     ~KVFileReadStream() override;
 
-    /// Fewer bytes than `length` only at the end; -1 when nothing could be read because of a
-    /// failure. What it returns is added to the position, so a failure takes 1 off.
+    /// Fewer bytes than `length` at the end or in front of a failure; -1 when nothing could be read
+    /// because of one. What it returns is added to the position, so -1 takes 1 off: `setPos` makes
+    /// it good, and reading can go on from there.
     long long read(void* data, unsigned long long length) override;
     /// Nothing is written: 0.
     long long write(void const* data, unsigned long long length) override;
     unsigned long long getPos() override;
-    /// Behind the end, `read` returns 0. A file that has no positions (a pipe) stays where it is
-    /// and keeps the failure.
+    /// Behind the end, `read` returns 0 then. A file that has no positions (a pipe) stays where it
+    /// is and keeps the failure.
     void setPos(unsigned long long position) override;
     int getError() const override;
 

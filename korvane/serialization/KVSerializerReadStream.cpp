@@ -80,6 +80,8 @@ void KVSerializerReadStream::popElement()
         else if (info.element)
             break;
     }
+    // Off the stack first: nobody meets a dying element there, and one whose destruction throws or
+    // pops again is not destroyed twice.
     elements_.pop_back();
     destroyElement(element);
 }

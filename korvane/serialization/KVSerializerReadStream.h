@@ -58,7 +58,7 @@ public:
     virtual void stopParse() = 0;
     /// Called by a handler in `parseElement`: passes over all that is inside the current element.
     virtual void ignoreElement();
-    /// Deletes the element, if not null.
+    /// Ends an element that has been taken off the stack: deletes it, if not null.
     virtual void destroyElement(KVStreamElement* element);
 
     // --- Handlers ---
@@ -80,7 +80,8 @@ public:
 
     /// Makes `element` the current one and takes it over, to be given to `destroyElement`.
     void pushElement(KVStreamElement* element);
-    /// Destroys the current element and goes back to the one around it, if there is one.
+    /// Takes the current element off, if there is one, and gives it to `destroyElement`; the one
+    /// around it is the current one by then.
     void popElement();
     KVStreamElement* currentElement() const noexcept
     {

@@ -28,8 +28,9 @@ public:
     virtual long long write(void const* data, unsigned long long length) = 0;
     /// In bytes from the start.
     virtual unsigned long long getPos() = 0;
+    /// Goes to a position. What one behind the end does, each stream tells.
     virtual void setPos(unsigned long long position) = 0;
-    /// The `errno` value of the latest failure; 0 when there was none.
+    /// The `errno` value of the first failure, which stays; 0 when there was none.
     virtual int getError() const = 0;
 
     /// Writes two blanks for each level. They come from a constant of 39 blanks and a zero byte,

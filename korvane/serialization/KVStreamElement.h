@@ -22,10 +22,10 @@ class KVString;
 ///         return true;
 ///     }
 ///
-/// The getters answer true when there was a value and it could be read; the output is then set.
-/// Those for a UUID answer a new KVUUID, which the caller owns, or null. Attributes are asked
-/// for by their token. An element lives from its start to its end in the document; keep no
-/// pointer to it.
+/// The getters answer true when there was a value and it could be read; the output is then set,
+/// what a class below says apart. Those for a UUID answer a new KVUUID, which the caller deletes,
+/// or null. Attributes are asked for by their token. An element lives from its start to its end in
+/// the document; keep no pointer to it.
 class KV_EXPORT KVStreamElement {
 public:
     KVStreamElement(unsigned int elementToken, KVScope* inScope,
@@ -72,7 +72,7 @@ public:
     virtual bool isXMLStreamElement();
 
     /// Reads 32 hexadecimal digits, upper or lower case and nothing between them, as the four
-    /// words of a UUID in order. Answers a new KVUUID, which the caller owns, and moves the
+    /// words of a UUID in order. Answers a new KVUUID, which the caller deletes, and moves the
     /// cursor behind the last digit; any other character gives null and leaves the cursor.
     static KVUUID* atoUUID(char const** cursor);
     /// Reads a time as "value timescale flags epoch", decimal but for the hexadecimal flags. What

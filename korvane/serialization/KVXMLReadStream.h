@@ -41,9 +41,10 @@ class KV_EXPORT KVXMLReadStream : public KVSerializerReadStream {
 public:
     /// Opens the file. Sets the process's LC_NUMERIC to "C" if it is not; so do the other two.
     explicit KVXMLReadStream(KVURL const& url);
-    /// The bytes are not copied and must outlive the stream.
+    /// The bytes are not copied and must outlive the stream. Null, or a negative length, is nothing
+    /// to read.
     KVXMLReadStream(char const* bytes, int length);
-    /// Retains the data.
+    /// Retains the data; null is nothing to read.
     explicit KVXMLReadStream(__CFData const* data);
     ~KVXMLReadStream() override;
 
@@ -64,7 +65,7 @@ public:
     /// Sets the process's LC_NUMERIC to "C" if it is not.
     static void fixLocale();
 
-    /// Null when it reads from memory.
+    /// The place of the file that is read; a null URL when it reads from memory.
     KVURL getURL() const;
 
     /// Not owned; null for none. Set it before `parse()`: it makes the reader go line by line.

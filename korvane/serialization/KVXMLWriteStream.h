@@ -25,15 +25,19 @@ class KVStream;
 ///
 ///     </vzml>
 ///
-/// Bytes go to the stream below as they come. An element without values and children closes as
+/// Bytes go to the byte stream as they come. An element without values and children closes as
 /// "/>", one with values alone on their line, one with children on a line of its own; children
 /// are indented by one tab. Values of one element follow each other with nothing between: who
 /// writes several writes the separators as text. An attribute that is written after a value or
 /// a child lands in the element's text.
 ///
 /// Of text, "&", "<", ">" and the double quote are escaped, and nothing else; it ends at a U+0000.
-/// Characters that XML does not allow (most of those below U+0020) are written as they are.
-/// Numbers stand in the C locale's form, "%.10g" for `float` and "%.17g" for `double`.
+/// Characters that XML does not allow (most of those below U+0020) are written as they are, and so
+/// is the carriage return, which readers take for a line feed. Numbers stand in the C locale's
+/// form, "%.10g" for `float` and "%.17g" for `double`.
+///
+/// Depth has no limit, but n levels take some n^2 bytes of tabs: a thousand a megabyte. The binary
+/// form is the one for documents that are deep.
 class KV_EXPORT KVXMLWriteStream : public KVSerializerWriteStream {
 public:
     /// Writes the header at once. The stream is not owned and must outlive this one. Sets the
@@ -78,7 +82,8 @@ public:
     void writeOptionalAttribute(unsigned int token, KVString const& value) override;
     void writeBlankLine() override;
 
-    /// That of the stream below if it is a KVFileWriteStream, otherwise null.
+    /// The place of the file that is written; a null URL when the byte stream is no
+    /// KVFileWriteStream.
     KVURL getURL() const;
 
     /// Puts the ">" of a pending start tag, if it is pending, in a buffer that holds what goes out

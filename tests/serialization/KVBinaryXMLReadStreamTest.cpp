@@ -200,6 +200,29 @@ TEST(KVBinaryXMLReadStream, ReadsBackWhatIsWritten)
     EXPECT_EQ(recorder.log, "(scene@2=2147483648:" + longText + " ()scene ");
 }
 
+// Meant: a whole double goes out as an integer, and a negative one of up to four bytes is read as
+// an int.
+TEST(KVBinaryXMLReadStream, CutsWholeNegativeDoubles)
+{
+    KVBufferWriteStream bytes(0, 4096);
+    KVBinaryXMLWriteStream out(bytes, 1, 2);
+    out.pushScope(scope);
+    for (double const value : {-0x1p31, -0x1p31 - 1, -3e9, 1 - 0x1p32, -0x1p32}) {
+        out.startElement(3);
+        out.writeValue(value);
+        out.endElement();
+    }
+    SceneRecorder recorder;
+    std::string read;
+    recorder.onElement = [&](auto&, KVStreamElement& e) {
+        KVString text;
+        e.getAsString(&text);
+        read += text.toUTF8() + " ";
+    };
+    EXPECT_TRUE(parse(textOf(bytes), recorder));
+    EXPECT_EQ(read, "-2147483648 2147483647 1294967296 1 -4294967296 ");
+}
+
 TEST(KVBinaryXMLReadStream, GivesAnElementsValueAsEveryKind)
 {
     SceneRecorder recorder;

@@ -1,7 +1,11 @@
 #include "SerializationSupport.h"
 
 #include <cerrno>
+#include <cstdint>
 #include <random>
+
+#include <sys/mman.h>
+#include <unistd.h>
 
 TEST(KVFileWriteStream, WritesAndEmptiesAFile)
 {
@@ -126,4 +130,32 @@ TEST(KVFileReadStream, LowersItsPositionByAFailure)
     EXPECT_EQ(missing.read(&byte, 1), -1);
     KVFileReadStream null((KVURL()));
     EXPECT_EQ(null.getError(), ENOENT);
+}
+
+// A failure between bytes that can be read: the end of a page of this process's memory with nothing
+// mapped behind it.
+TEST(KVFileReadStream, GoesOnAfterAFailure)
+{
+    auto const page = static_cast<std::size_t>(sysconf(_SC_PAGESIZE));
+    void* const pages =
+        mmap(nullptr, 2 * page, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
+    ASSERT_NE(pages, MAP_FAILED);
+    char* const end = static_cast<char*>(pages) + page;
+    munmap(end, page);
+    std::copy_n("last", 4, end - 4);
+
+    KVFileReadStream memory(urlOf("/proc/self/mem"));
+    auto const position = reinterpret_cast<std::uintptr_t>(end);
+    char bytes[8];
+    memory.setPos(position);
+    EXPECT_EQ(memory.read(bytes, 1), -1);
+    EXPECT_EQ(memory.getError(), EIO);
+    EXPECT_EQ(memory.getPos(), position - 1);
+    memory.setPos(position - 1);
+    EXPECT_EQ(memory.read(bytes, 1), 1);
+    EXPECT_EQ(bytes[0], 't');
+    memory.setPos(position - 4);
+    EXPECT_EQ(memory.read(bytes, 8), 4) << "what there is in front of the failure";
+    EXPECT_EQ(std::string(bytes, 4), "last");
+    munmap(pages, page);
 }

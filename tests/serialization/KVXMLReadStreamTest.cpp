@@ -95,6 +95,7 @@ TEST(KVXMLReadStream, GathersText)
     } const rows[] = {
         {plain, " spaced\nlines ", ": spaced\nlines "},
         {plain, "a &amp; b &#233;", ":a & b é"},
+        {plain, "a\r\nb\rc&#13;d", ":a\nb\nc\rd"}, // line ends of XML
         // What the parser leaves escaped is replaced once more, "&amp;" first.
         {plain, "&amp;lt;&amp;amp;gt;&amp;quot;&amp;apos;", ":<>\"&apos;"},
         {plain, "ab<?pi?>cd<!-- -->ef", ":ab\ncd\nef"},
