@@ -1,8 +1,8 @@
 #include <korvane/media/KVAtomMetadataHandler.h>
 
+#include <korvane/foundation/KVNSRef.h>
 #include <korvane/media/KVAtomStatus_p.h>
 #include <korvane/media/KVMovieMetadata_p.h>
-#include <korvane/platform/CFDictionary_p.h>
 
 #include <algorithm>
 #include <string>
@@ -47,7 +47,7 @@ void setUUIDAtomBox(KVAtomBox& parent, CFDataRef payload)
 
 } // namespace
 
-KVAtomMetadataHandler::KVAtomMetadataHandler() : metadata_(kv::makeDictionary()) {}
+KVAtomMetadataHandler::KVAtomMetadataHandler() : metadata_(KVMakeRef<NSMutableDictionary>()) {}
 
 KVAtomMetadataHandler::KVAtomMetadataHandler(KVAtomMetadataHandler const& other)
     : KVAtomBoxFile(other),

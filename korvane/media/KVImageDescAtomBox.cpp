@@ -1,7 +1,7 @@
 #include <korvane/media/KVImageDescAtomBox.h>
 
+#include <korvane/foundation/KVNSRef.h>
 #include <korvane/media/KVAtomBytes_p.h>
-#include <korvane/platform/CFDictionary_p.h>
 
 #include <algorithm>
 #include <cstring>
@@ -53,7 +53,7 @@ CFDataRef dataNamed(CFDictionaryRef dictionary, unsigned int type)
 KVCFRef<CFMutableDictionaryRef> selectData(CFDictionaryRef dictionary,
                                            std::span<unsigned int const> types)
 {
-    auto selected = kv::makeDictionary();
+    auto selected = KVMakeRef<NSMutableDictionary>();
     for (unsigned int const type : types)
         if (CFDataRef const data = dataNamed(dictionary, type))
             selected->setValue(typeName(type), data);
@@ -395,7 +395,7 @@ KVCFRef<CFMutableDictionaryRef>
 KVImageDescAtomBox::copyAtomBoxChildPayloads(KVAtomBox const* atom,
                                              std::span<unsigned int const> types) const
 {
-    auto payloads = kv::makeDictionary();
+    auto payloads = KVMakeRef<NSMutableDictionary>();
     for (unsigned int const type : types) {
         KVAtomBox const* const child = atom ? atom->findFirstChild(true, type) : nullptr;
         // One that was made here has no place in the source.

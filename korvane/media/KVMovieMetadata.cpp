@@ -1,8 +1,8 @@
 #include <korvane/media/KVMovieMetadata_p.h>
 
+#include <korvane/foundation/KVNSRef.h>
 #include <korvane/media/KVAtomBytes_p.h>
 #include <korvane/media/KVXMPStringParser.h>
-#include <korvane/platform/CFDictionary_p.h>
 #include <korvane/platform/CFNumber.h>
 
 #include <algorithm>
@@ -172,7 +172,7 @@ int metadataInteger(CFDictionaryRef metadata, char const* key, int otherwise) no
 
 MetadataRef createParsedAdobeXMPMetadata(KVString const& text)
 {
-    auto result = kv::makeDictionary();
+    auto result = KVMakeRef<NSMutableDictionary>();
     KVXMPStringParser parser;
     if (!text.empty() && parser.parseXMPString(text))
         flattenDictionary(parser.parsedData(), result);
@@ -182,12 +182,12 @@ MetadataRef createParsedAdobeXMPMetadata(KVString const& text)
 MetadataRef createParsedGoogleV1Metadata(KVString const& text)
 {
     auto result = createParsedAdobeXMPMetadata(text);
-    return result->value("GSpherical:ProjectionType") ? result : kv::makeDictionary();
+    return result->value("GSpherical:ProjectionType") ? result : KVMakeRef<NSMutableDictionary>();
 }
 
 MetadataRef createParsedGoogleV2Metadata(KVImageDescAtomBox const& descriptions)
 {
-    auto result = kv::makeDictionary();
+    auto result = KVMakeRef<NSMutableDictionary>();
     auto const payloads = descriptions.copyImageDescGoogleV2Info(0);
     if (CFDataRef const st3d = payloadOf(payloads, "st3d", 5))
         setText(result, "stereo_mode", std::to_string(st3d->bytes()[kVersionAndFlags]));
@@ -219,7 +219,7 @@ MetadataRef createParsedGoogleV2Metadata(KVImageDescAtomBox const& descriptions)
 
 MetadataRef createParsedHDRMetadata(KVImageDescAtomBox const& descriptions)
 {
-    auto result = kv::makeDictionary();
+    auto result = KVMakeRef<NSMutableDictionary>();
     auto const payloads = descriptions.copyImageDescHDRInfo(0);
     if (CFDataRef const mdcv = payloadOf(payloads, "mdcv", 1))
         readFields(mdcv, 0, kMasteringDisplay, result);
@@ -230,7 +230,7 @@ MetadataRef createParsedHDRMetadata(KVImageDescAtomBox const& descriptions)
 
 MetadataRef createParsedStandardExtensionData(KVImageDescAtomBox const& descriptions)
 {
-    auto result = kv::makeDictionary();
+    auto result = KVMakeRef<NSMutableDictionary>();
     int first = 0, second = 0, third = 0;
     if (descriptions.getImageDescColorInfo(0, &first, &second, &third) == 0) {
         setText(result, "color_primaries", std::to_string(first));
@@ -291,7 +291,7 @@ MetadataRef createRawGoogleV2Metadata(CFDictionaryRef metadata)
 {
     if (!metadata || metadata->count() == 0)
         return nullptr;
-    auto payloads = kv::makeDictionary();
+    auto payloads = KVMakeRef<NSMutableDictionary>();
     std::vector<std::uint8_t> const empty(kVersionAndFlags);
 
     auto st3d = empty;
@@ -333,7 +333,7 @@ MetadataRef createRawHDRMetadata(CFDictionaryRef metadata)
 {
     if (!metadata || metadata->count() == 0)
         return nullptr;
-    auto payloads = kv::makeDictionary();
+    auto payloads = KVMakeRef<NSMutableDictionary>();
     std::vector<std::uint8_t> mdcv, clli;
     writeFields(metadata, kMasteringDisplay, mdcv);
     writeFields(metadata, kContentLight, clli);

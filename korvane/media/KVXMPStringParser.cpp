@@ -1,6 +1,6 @@
 #include <korvane/media/KVXMPStringParser.h>
 
-#include <korvane/platform/CFDictionary_p.h>
+#include <korvane/foundation/KVNSRef.h>
 
 #include <algorithm>
 #include <exception>
@@ -100,7 +100,7 @@ struct KVXMPStringParser::Handlers {
     static void startElement(void* user, xmlChar const* name, xmlChar const** attributes) noexcept
     {
         guard(user, [&](KVXMPStringParser& parser) {
-            auto const dictionary = kv::makeDictionary();
+            auto const dictionary = KVMakeRef<NSMutableDictionary>();
             for (; attributes && attributes[0]; attributes += 2)
                 dictionary->setValue(fromXML(attributes[0]).cf_str(),
                                      fromXML(attributes[1]).cf_str());
@@ -134,7 +134,7 @@ struct KVXMPStringParser::Handlers {
     static void warning(void*, char const*, ...) noexcept {}
 };
 
-KVXMPStringParser::KVXMPStringParser() : result_(kv::makeDictionary()) {}
+KVXMPStringParser::KVXMPStringParser() : result_(KVMakeRef<NSMutableDictionary>()) {}
 
 KVXMPStringParser::~KVXMPStringParser() = default;
 
@@ -211,7 +211,7 @@ void KVXMPStringParser::startDocument()
         level = Level();
     text_.clear();
     hasText_ = false;
-    result_ = kv::makeDictionary();
+    result_ = KVMakeRef<NSMutableDictionary>();
 }
 
 void KVXMPStringParser::startElement(KVString const& name, CFDictionaryRef attributes)
@@ -220,7 +220,7 @@ void KVXMPStringParser::startElement(KVString const& name, CFDictionaryRef attri
         // A level inside itself, or around one that is inside it, starts anew.
         for (int level = opened; level <= kInner; ++level)
             levels_[level] = Level();
-        levels_[opened] = {name, kv::makeDictionary()};
+        levels_[opened] = {name, KVMakeRef<NSMutableDictionary>()};
     }
     text_.clear();
     hasText_ = true;
@@ -260,7 +260,7 @@ void KVXMPStringParser::storeText(KVString const& name)
         target.setValue(name.cf_str(), text.cf_str());
         return;
     }
-    auto const both = kv::makeDictionary();
+    auto const both = KVMakeRef<NSMutableDictionary>();
     if (auto const* const dictionary = dynamic_cast<CFDictionaryRef>(old)) {
         for (std::size_t i = 0; i < dictionary->count(); ++i)
             both->setValue(dictionary->keyAtIndex(i), dictionary->valueAtIndex(i));

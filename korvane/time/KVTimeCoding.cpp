@@ -1,7 +1,6 @@
 #include <korvane/time/KVTimeCoding.h>
 
 #include <korvane/foundation/KVNSRef.h>
-#include <korvane/platform/CFDictionary_p.h>
 #include <korvane/platform/CFNumber.h>
 #include <korvane/time/KVTime.h>
 
@@ -69,7 +68,7 @@ std::optional<std::int64_t> numberOf(CFDictionaryRef dictionary, std::string_vie
 
 KVCFRef<CFDictionaryRef> CMTimeCopyAsDictionary(CMTime const& time)
 {
-    auto const dictionary = kv::makeDictionary();
+    auto const dictionary = KVMakeRef<NSMutableDictionary>();
     setNumber(dictionary, "value", time.value);
     setNumber(dictionary, "timescale", time.timescale);
     setNumber(dictionary, "flags", time.flags);
@@ -92,7 +91,7 @@ CMTime CMTimeMakeFromDictionary(CFDictionaryRef dictionary) noexcept
 
 KVCFRef<CFDictionaryRef> CMTimeRangeCopyAsDictionary(CMTimeRange const& range)
 {
-    auto const dictionary = kv::makeDictionary();
+    auto const dictionary = KVMakeRef<NSMutableDictionary>();
     dictionary->setValue("start", CMTimeCopyAsDictionary(range.start));
     dictionary->setValue("duration", CMTimeCopyAsDictionary(range.duration));
     return dictionary;
