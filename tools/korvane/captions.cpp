@@ -354,7 +354,8 @@ void check(CheckOptions const& options)
 
 void addCaptionsCommands(CLI::App& program)
 {
-    CLI::App& captions = *program.add_subcommand("captions", "SubRip captions");
+    CLI::App& captions =
+        *program.add_subcommand("captions", "List, move, explain and mend SubRip captions");
     captions.require_subcommand(1);
     char const* const frameHelp =
         "The length of a frame in seconds, such as 1001/24000; times go up to whole frames";
@@ -396,6 +397,6 @@ void addCaptionsCommands(CLI::App& program)
 
     addExamples(
         captions,
-        "  korvane captions check lighthouse.srt\n"
-        "  korvane captions convert lighthouse.srt later.srt --offset 2.5 --frame 1001/24000");
+        {"korvane captions check lighthouse.srt",
+         "korvane captions convert lighthouse.srt later.srt --offset 2.5 --frame 1001/24000"});
 }

@@ -171,7 +171,7 @@ void addReportCommands(CLI::App& program)
 {
     auto const options = std::make_shared<Options>();
     CLI::App& command =
-        *program.add_subcommand("report", "Show files as pictures, on one HTML page");
+        *program.add_subcommand("report", "Show files of all kinds as pictures on one HTML page");
     command.add_option("FILE", options->files, "Scenes, captions, LUTs, movies and matrices, or -")
         ->required();
     command.add_option("-o,--output", options->output, "The page to write, or -")
@@ -185,4 +185,9 @@ void addReportCommands(CLI::App& program)
                    "Of very large files the page shows the whole in a coarser picture, and the\n"
                    "first rows of its tables, and tells how many more there are.");
     command.callback([options] { report(*options); });
+
+    addExamples(command,
+                {"korvane report showreel.vzml lighthouse.srt warm-evening.cube camera.txt "
+                 "-o report.html",
+                 "korvane report sphere.mp4 --before movie.mp4 -o changes.html"});
 }

@@ -299,7 +299,7 @@ void addSceneCommands(CLI::App& program)
     addJsonFlag(diffCommand, options->json);
     diffCommand.callback([options] { diff(options->file, options->output, options->json); });
 
-    addExamples(family, "  korvane scene show showreel.vzml\n"
-                        "  korvane scene convert showreel.vzml showreel.vzb --to binary\n"
-                        "  korvane scene diff showreel.vzml showreel.vzb");
+    addExamples(family, {"korvane scene show showreel.vzml",
+                         "korvane scene convert showreel.vzml showreel.vzb --to binary",
+                         "korvane scene diff showreel.vzml showreel.vzb"});
 }

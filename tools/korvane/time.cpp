@@ -146,9 +146,7 @@ void addTimeCommands(CLI::App& program)
 {
     auto options = std::make_shared<TimeOptions>();
     CLI::App& time = *program.add_subcommand("time", "Calculate with exact times");
-    time.add_option("EXPRESSION", options->words, "What to calculate, see below")
-        ->required()
-        ->type_name("");
+    time.add_option("EXPRESSION", options->words, "What to calculate")->required();
     time.add_option("--frame", options->frame, "The length of a frame in seconds")
         ->type_name("TIME");
     time.add_option("--times", options->times, "How often a sum takes its time")
@@ -159,6 +157,6 @@ void addTimeCommands(CLI::App& program)
     time.footer(timeFooter);
     time.callback([options] { runTime(*options); });
 
-    addExamples(time, "  korvane time \"1001/30000 * 30000\"\n"
-                      "  korvane time floor 3.52 --frame 1001/24000");
+    addExamples(time, {"korvane time \"1001/30000 * 30000\"",
+                       "korvane time floor 3.52 --frame 1001/24000"});
 }
