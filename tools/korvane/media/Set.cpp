@@ -2,6 +2,7 @@
 
 #include "../Input.h"
 #include "../Json.h"
+#include "../Markup.h"
 #include "../ToolError.h"
 #include "Commands.h"
 #include "Metadata.h"
@@ -110,9 +111,9 @@ void setProjection(SetOptions const& options, KVImageDescAtomBox& descriptions,
         else
             for (char const* key : kCubeKeys)
                 values->setValue(key, nullptr);
-        for (char const* key : {toCube ? kCubeKeys[0] : kBoundKeys[0]})
-            if (!values->value(key))
-                setValue(values, key, "0");
+        char const* const needed = toCube ? kCubeKeys[0] : kBoundKeys[0];
+        if (!values->value(needed))
+            setValue(values, needed, "0");
     }
     if (options.cubeLayout)
         setValue(values, kCubeKeys[0], std::to_string(*options.cubeLayout));
@@ -174,12 +175,7 @@ Values firstGenerationValues(SetOptions const& options, Values const& second)
              stereo == "1"   ? "top-bottom"
              : stereo == "2" ? "left-right"
                              : "mono");
-    setValue(values, "GSpherical:StitchingSoftware", [&] {
-        std::string escaped;
-        for (char const c : textOf("metadata_source"))
-            escaped += c == '&' ? "&amp;" : c == '<' ? "&lt;" : std::string(1, c);
-        return escaped;
-    }());
+    setValue(values, "GSpherical:StitchingSoftware", escaped(textOf("metadata_source")));
     for (auto const& [key, degrees] :
          {std::pair{"GSpherical:InitialViewHeadingDegrees", options.yaw},
           std::pair{"GSpherical:InitialViewPitchDegrees", options.pitch},
