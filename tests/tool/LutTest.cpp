@@ -129,6 +129,7 @@ TEST(ToolLut, ConvertsBetweenFormatsAndSizes)
     EXPECT_THAT(lost.messages, HasSubstr("cannot tell the domain 0 to 2"));
 
     EXPECT_EQ(runTool({"lut", "convert", in, folder.path("out.txt")}).exitCode, 2);
+    EXPECT_EQ(runTool({"lut", "convert", in, back, "--index", "-1"}).exitCode, 2);
     ToolResult const full = runTool({"lut", "convert", in, "/dev/full", "--format", "cube"});
     EXPECT_EQ(full.exitCode, 4);
     EXPECT_EQ(full.messages, "korvane: /dev/full: No space left on device\n");

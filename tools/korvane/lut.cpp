@@ -9,16 +9,12 @@
 
 #include <algorithm>
 #include <cctype>
-#include <cerrno>
 #include <charconv>
 #include <cmath>
 #include <filesystem>
 #include <map>
 #include <memory>
 #include <sstream>
-
-#include <fcntl.h>
-#include <unistd.h>
 
 namespace {
 
@@ -95,25 +91,14 @@ unsigned int formatFor(std::string const& path)
 void writeLut(cc::lut_t const& lut, std::string const& path, unsigned int format)
 {
     AtomicOutput output(path);
-    bool const direct =
-        path == "-" || (std::filesystem::exists(path) && !std::filesystem::is_regular_file(path));
-    int const fd = path == "-" ? ::dup(STDOUT_FILENO)
-                               : ::open(direct ? path.c_str() : output.temporaryPath().c_str(),
-                                        O_WRONLY | O_CLOEXEC);
-    if (fd < 0)
-        throw inputOutput(path, errno);
     std::string const stem = path == "-" ? "" : std::filesystem::path(path).stem();
     int error = 0;
     if (format == cc::lut_t::kMGA)
-        lut.writeMGA(fd, stem.c_str(), &error);
+        lut.writeMGA(output.descriptor(), stem.c_str(), &error);
     else
-        lut.writeCUBE(fd, stem.c_str(), &error);
-    if (::close(fd) != 0 && error == 0)
-        error = errno;
-    if (error == EPIPE)
-        throw ToolError(ExitCode::InputOutput, ""); // the reader has had enough: nothing to say
+        lut.writeCUBE(output.descriptor(), stem.c_str(), &error);
     if (error != 0)
-        throw inputOutput(path == "-" ? "standard output" : path, error);
+        output.fail(error);
     output.commit();
 }
 
@@ -224,6 +209,7 @@ void plot(std::string const& path, std::string const& out, unsigned long index, 
 void addIndex(CLI::App& command, unsigned long& index)
 {
     command.add_option("--index", index, "Which table of the file, 0 for the first")
+        ->check(CLI::NonNegativeNumber)
         ->type_name("N");
 }
 

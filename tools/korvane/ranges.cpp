@@ -102,12 +102,6 @@ VexTimeRangeArray readSet(std::string const& set)
     return isList ? readList(set) : readRangeFile(set);
 }
 
-std::string nameOf(VexTimeRangeObj const* range)
-{
-    auto const* owner = dynamic_cast<VexTimeRangeAndObject const*>(range);
-    return owner ? owner->object()->description().toUTF8() : std::string();
-}
-
 std::string listText(VexTimeRangeArray const& ranges)
 {
     std::string text;
