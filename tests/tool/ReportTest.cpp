@@ -260,7 +260,15 @@ TEST(ToolReport, FailuresNameTheFileAndTheReason)
     EXPECT_EQ(runTool({"report", original, "--before", folder.path("x"), "-o", "-"}).exitCode, 4);
     EXPECT_EQ(runTool({"report", matrix, "--before", original, "-o", "-"}).exitCode, 2);
     EXPECT_EQ(runTool({"report", "-", "-", "-o", "-"}).exitCode, 2);
+    EXPECT_EQ(runTool({"report", original, "-", "--before", "-", "-o", "-"}).exitCode, 2);
     EXPECT_EQ(runTool({"report", matrix}).exitCode, 2);
+    std::string const input = folder.write("input", scene(""));
+    EXPECT_EQ(runTool({"report", input, "-o", input}).exitCode, 2);
+    EXPECT_EQ(folder.read("input"), scene(""));
+    // What is wrong with the original is told under the original's name.
+    ToolResult const noOriginal = runTool({"report", original, "--before", "-", "-o", "-"}, "x");
+    EXPECT_EQ(noOriginal.exitCode, 3);
+    EXPECT_EQ(noOriginal.messages, "korvane: standard input: is no QuickTime or MP4 file\n");
 }
 
 // --- In a browser ---

@@ -7,7 +7,6 @@
 
 #include <korvane/foundation/KVException.h>
 #include <korvane/serialization/KVBufferWriteStream.h>
-#include <korvane/serialization/KVFileWriteStream.h>
 
 #include <chrono>
 #include <map>
@@ -135,7 +134,7 @@ void check(std::string const& path, bool json)
         printJson(
             {{"file", path}, {"form", nameOf(document->form)}, {"findings", std::move(list)}});
     } else {
-        std::string const name = path == "-" ? "standard input" : path;
+        std::string const name = inputName(path);
         std::string text;
         for (scene::Finding const& finding : document->findings)
             text += name + ":" + (finding.line ? std::to_string(finding.line) + ":" : "") + " " +
