@@ -70,8 +70,6 @@ figcaption { color: var(--soft); font-size: 13px; margin-top: 4px; max-width: 42
 .legend { display: flex; flex-wrap: wrap; gap: 4px 16px; padding: 0; margin: 8px 0 10px; list-style: none; font-size: 13px; color: var(--soft); }
 .patch { vertical-align: -1px; margin-right: 6px; }
 details > summary { cursor: pointer; }
-details.more { margin-top: 12px; }
-details.more > summary { color: var(--accent); }
 .rows { max-height: 26em; overflow-y: auto; margin-top: 10px; border: 1px solid var(--edge); border-radius: 6px; }
 table { border-collapse: collapse; width: 100%; font-size: 13.5px; }
 caption { position: absolute; left: -9999px; }
@@ -96,7 +94,6 @@ svg .soft { fill: var(--soft); font-size: 11px; }
 svg .small { font-size: 11px; }
 svg .mid { text-anchor: middle; }
 svg .end { text-anchor: end; }
-svg .strong { font-weight: 600; }
 .line { stroke: var(--grid); }
 .axisline { stroke: var(--sames); }
 .lane { fill: var(--head); }
@@ -121,7 +118,6 @@ rect.all { fill: var(--ink); }
 .frame { fill: none; stroke: var(--edge); }
 .unit { fill: none; stroke: var(--sames); stroke-dasharray: 5 4; stroke-width: 1.5; }
 .xaxis { stroke: var(--red); stroke-width: 2.5; fill: none; } .yaxis { stroke: var(--green); stroke-width: 2.5; fill: none; }
-svg text.bad { fill: var(--bad); }
 footer { color: var(--soft); font-size: 13px; margin-top: 24px; }
 @media (max-width: 600px) {
   body { padding: 0 10px 32px; }

@@ -17,11 +17,15 @@ std::string ending(char const* element, std::string_view tooltip)
     return "><title>" + escaped(tooltip) + "</title></" + element + ">\n";
 }
 
-/// By the first byte of a character: wide scripts begin behind U+2E80.
+/// By the first byte of a character, as common typefaces have them: wide scripts begin behind
+/// U+2E80.
 double widthOf(char lead)
 {
     auto const byte = static_cast<unsigned char>(lead);
-    return byte < 0x80 ? 6.7 : byte < 0xC0 ? 0 : byte < 0xE2 ? 7.2 : byte == 0xE2 ? 8 : 12.5;
+    if (byte >= 0x80)
+        return byte < 0xC0 ? 0 : byte < 0xE2 ? 7.4 : byte == 0xE2 ? 8 : 12.5;
+    constexpr std::string_view narrow = " !'()*,-./:;I[]fijlrt|", wide = "%@MWmw";
+    return narrow.find(lead) != narrow.npos ? 4.8 : wide.find(lead) != wide.npos ? 11.6 : 7.6;
 }
 
 } // namespace

@@ -77,9 +77,12 @@ struct Strips {
             count = static_cast<std::size_t>(strips);
             break;
         }
+        // The labels of the first two ticks, and of the last two, are the closest: one of them
+        // stands beside its tick and one in the middle.
+        double const farthest = -first > last ? first : last;
         tick = length;
         for (double const step : steps)
-            if (across * step / length >= 84) {
+            if (across * step / length >= 1.5 * widthOf(clockText(farthest, step)) + 4) {
                 tick = std::min(length, step);
                 break;
             }
