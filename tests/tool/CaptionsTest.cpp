@@ -135,6 +135,7 @@ TEST(CaptionsTool, CheckTellsLineFoundAndExpected)
          1,
          {":2: error: found \"9"}},
         {"\xFF\xD8\xFF\xE0 no text at all", 1, {":1: error: found", "a caption's number"}},
+        {"\x1B[2J\n1\n$A\n", 1, {":1: error: found \"?[2J\""}},
         {"", 1, {": error: found no text at all"}},
     };
     ScratchFolder const folder;

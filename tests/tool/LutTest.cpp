@@ -66,8 +66,7 @@ TEST(ToolLut, ARefusedFileIsToldByItsLine)
         {"TITLE \"a\"\r\n\r\nLUT_3D_SIZE 257\r\n",
          ":3: LUT_3D_SIZE must be 1 to 256: \"LUT_3D_SIZE 257\"\n"},
         {"LUT_1D_SIZE 0\n", ":1: LUT_1D_SIZE must be 1 to 65536: \"LUT_1D_SIZE 0\"\n"},
-        {"LUT_3D_SIZE 64\n0 0 0\n",
-         ":1: LUT_3D_SIZE announces 262144 rows, and the file is too short for them\n"},
+        {"LUT_3D_SIZE 64\n0 0 0\n", ":3: the data end after 1 row, and line 1 announces 262144\n"},
         {"TITLE \"a\"\nDOMAIN 0 1\n",
          ":2: no size stands before this row of data: \"DOMAIN 0 1\"\n"},
         {"LUT_3D_SIZE 1\n# a\n0 0 0\n0 0 1\n",
@@ -76,8 +75,8 @@ TEST(ToolLut, ARefusedFileIsToldByItsLine)
         {"LUT_3D_SIZE 1\nLUT_3D_SIZE 1\n0 0 0\n\n", // the second table
          ":5: the data end after 0 rows, and line 2 announces 1\n"},
         {mga + "in -2\n", ":2: \"in\" must be 0 to 16777216: \"in -2\"\n"},
-        {mga + "in 100\nvalues a b c\n",
-         ":2: \"in\" announces 100 rows, and the file is too short for them\n"},
+        {mga + "in 100\nin 2\nvalues a b c\n0 1 2 3\n", // the second one holds
+         ":6: the data end after 1 row, and line 3 announces 2\n"},
         {mga + "in 1\n0 1 2 3\n",
          ":4: the file ends without a line \"values\" and data behind it\n"},
         {mga + "in 2\nvalues a b c\n1 1 2 3\n2 1 2 3\n",
@@ -129,6 +128,7 @@ TEST(ToolLut, ConvertsBetweenFormatsAndSizes)
     EXPECT_THAT(lost.messages, HasSubstr("cannot tell the domain 0 to 2"));
 
     EXPECT_EQ(runTool({"lut", "convert", in, folder.path("out.txt")}).exitCode, 2);
+    EXPECT_EQ(runTool({"lut", "convert", in, back, "--index", "-1"}).exitCode, 2);
     ToolResult const full = runTool({"lut", "convert", in, "/dev/full", "--format", "cube"});
     EXPECT_EQ(full.exitCode, 4);
     EXPECT_EQ(full.messages, "korvane: /dev/full: No space left on device\n");

@@ -128,7 +128,7 @@ TEST(ToolMedia, MetadataIsSetAndStripped)
             set(sampleMovie(name), out,
                 "--spherical equirectangular --stereo top-bottom --yaw 10 --pitch=-20.5 "
                 "--bounds 0,0,0.25,0.5 --colour 9,16,9 --pixel-aspect 4:3 --field 2,9 "
-                "--first-generation --hdr " +
+                "--source <a>&\"b' --first-generation --hdr " +
                     mastering);
         EXPECT_EQ(result.exitCode, 0) << name << result.messages;
         EXPECT_THAT(result.messages, HasSubstr("bytes of samples compared"));
@@ -136,11 +136,13 @@ TEST(ToolMedia, MetadataIsSetAndStripped)
         Json metadata = jsonOf(media({"info", out, "--json"}))["metadata"];
         EXPECT_EQ(
             metadata["Google Version 2 Metadata"].dump(),
-            R"({"stereo_mode":"1","metadata_source":"Korvane","pose_yaw_degrees":"10.000000",)"
+            R"({"stereo_mode":"1","metadata_source":"<a>&\"b'","pose_yaw_degrees":"10.000000",)"
             R"("pose_pitch_degrees":"-20.500000","pose_roll_degrees":"0.000000",)"
             R"("projection_bounds_top":"0","projection_bounds_bottom":"0",)"
             R"("projection_bounds_left":"1073741824","projection_bounds_right":"-2147483648"})");
-        EXPECT_EQ(metadata["Google Version 1 Metadata"]["GSpherical:StereoMode"], "top-bottom");
+        Json const& first = metadata["Google Version 1 Metadata"];
+        EXPECT_EQ(first["GSpherical:StereoMode"], "top-bottom");
+        EXPECT_EQ(first["GSpherical:StitchingSoftware"], "<a>&\"b'");
         EXPECT_EQ(metadata["HDR Color and Light Level Metadata"]["white_point_x"], "15635");
         Json const& standard = metadata["Standard Extensions Metadata"];
         EXPECT_EQ(standard["color_transfer"], "16") << "in a form that can be read";

@@ -260,7 +260,15 @@ TEST(ToolReport, FailuresNameTheFileAndTheReason)
     EXPECT_EQ(runTool({"report", original, "--before", folder.path("x"), "-o", "-"}).exitCode, 4);
     EXPECT_EQ(runTool({"report", matrix, "--before", original, "-o", "-"}).exitCode, 2);
     EXPECT_EQ(runTool({"report", "-", "-", "-o", "-"}).exitCode, 2);
+    EXPECT_EQ(runTool({"report", original, "-", "--before", "-", "-o", "-"}).exitCode, 2);
     EXPECT_EQ(runTool({"report", matrix}).exitCode, 2);
+    std::string const input = folder.write("input", scene(""));
+    EXPECT_EQ(runTool({"report", input, "-o", input}).exitCode, 2);
+    EXPECT_EQ(folder.read("input"), scene(""));
+    // What is wrong with the original is told under the original's name.
+    ToolResult const noOriginal = runTool({"report", original, "--before", "-", "-o", "-"}, "x");
+    EXPECT_EQ(noOriginal.exitCode, 3);
+    EXPECT_EQ(noOriginal.messages, "korvane: standard input: is no QuickTime or MP4 file\n");
 }
 
 // --- In a browser ---
@@ -268,7 +276,8 @@ TEST(ToolReport, FailuresNameTheFileAndTheReason)
 namespace {
 
 /// Opens a page, as wide as a phone and as wide as a desk, in headless Chromium. Answers what it
-/// found: what it says on its console, pictures without extent, a page that scrolls sideways.
+/// found: what it says on its console, pictures without extent, texts that leave them, labels that
+/// overlap, a page that scrolls sideways.
 std::string faultsInBrowser(std::string const& html)
 {
     std::string quoted;
@@ -291,6 +300,16 @@ onload = () => {
       const box = svg.getBBox();
       ++pictures;
       if (!(box.width > 0 && box.height > 0)) faults.push('an empty picture');
+      const right = svg.getBoundingClientRect().right + 1;
+      let line = NaN, end = 0;
+      for (const text of svg.querySelectorAll('text')) {
+        const label = text.getBoundingClientRect();
+        if (label.right > right) faults.push('cut text ' + text.textContent);
+        if (!text.classList.contains('soft')) continue;
+        if (label.y === line && label.x < end) faults.push('overlap of ' + text.textContent);
+        line = label.y;
+        end = label.right;
+      }
     }
     for (const id of page.querySelectorAll('[aria-labelledby]'))
       for (const name of id.getAttribute('aria-labelledby').split(' '))
@@ -328,14 +347,19 @@ TEST(ToolReport, ABrowserShowsAllPicturesAndSaysNothing)
     if (runShell("command -v chromium").exitCode != 0)
         GTEST_SKIP() << "chromium is not installed";
     ScratchFolder const folder;
+    std::string const wide = folder.write("wide.srt", "1\n00:00:00,000 --> 9999:00:00,000\n" +
+                                                          std::string(300, 'W') + "\n");
     EXPECT_EQ(faultsInBrowser(page({data + "showreel.vzml", folder.write("over.srt", overlapping),
-                                    changedMovie(folder), data + "warm-evening.cube",
+                                    wide, changedMovie(folder), data + "warm-evening.cube",
                                     KORVANE_TEST_DATA "/lut/opencolorio-1d.cube",
                                     data + "camera.txt", "--before", original})),
               "");
     // The check itself sees what it is to see.
     EXPECT_THAT(
-        faultsInBrowser("<!DOCTYPE html><p style=\"width:2000px\">wide</p><svg></svg>"
+        faultsInBrowser("<!DOCTYPE html><p style=\"width:2000px\">wide</p><svg></svg><svg>"
+                        "<text y=\"9\" class=\"soft\">a</text><text y=\"9\" class=\"soft\">b"
+                        "</text><text x=\"299\" y=\"20\">long</text></svg>"
                         "<script>console.log('heard')</script>"),
-        AllOf(HasSubstr("pixels wide at 390"), HasSubstr("an empty picture"), HasSubstr("heard")));
+        AllOf(HasSubstr("pixels wide at 390"), HasSubstr("an empty picture"),
+              HasSubstr("overlap of b"), HasSubstr("cut text long"), HasSubstr("heard")));
 }

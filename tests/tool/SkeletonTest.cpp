@@ -33,6 +33,41 @@ TEST(ToolSkeleton, WrongUsageEndsWithCode2AndAMessage)
     }
 }
 
+TEST(ToolSkeleton, ReadsFilesOfAnyNameAndPipes)
+{
+    ScratchFolder const folder;
+    std::string const samples = KORVANE_SOURCE_DIR "/examples/data/";
+    struct Row {
+        char const* command;
+        std::string sample;
+    } const rows[] = {
+        {"scene check", samples + "showreel.vzml"},
+        {"captions show", samples + "lighthouse.srt"},
+        {"lut info", samples + "warm-evening.cube"},
+        {"matrix decompose", samples + "camera.txt"},
+        {"report -o -", samples + "showreel.vzml"},
+        {"media info", KORVANE_TEST_DATA "/media/head-moov.mp4"},
+        {"report -o -", KORVANE_TEST_DATA "/media/head-moov.mp4"},
+    };
+    for (Row const& row : rows) {
+        std::string const path = folder.write("<\xFF&\n[##]%41", folder.read(row.sample));
+        std::string const tool = "\"$KORVANE\" " + std::string(row.command);
+        for (std::string const& line :
+             {tool + " '" + path + "'", "cat '" + path + "' | " + tool + " /dev/stdin"}) {
+            if (line.starts_with("cat") && line.find("media") != line.npos)
+                continue; // gone through more than once
+            ToolResult const result = runShell(line);
+            EXPECT_EQ(result.exitCode, 0) << line;
+            EXPECT_THAT(result.messages, IsEmpty()) << line;
+        }
+    }
+    EXPECT_EQ(runTool({"scene", "show", folder.path("a\nb\x1B")}).messages,
+              "korvane: " + folder.path("a?b?") + ": No such file or directory\n");
+    EXPECT_EQ(runTool({"media", "tree", "-"}, "x").messages,
+              "korvane: standard input: a movie is gone through more than once: it must be a "
+              "file\n");
+}
+
 TEST(ToolSkeleton, OutputThatCannotBeWrittenEndsWithCode4)
 {
     struct Row {

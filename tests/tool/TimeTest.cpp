@@ -69,13 +69,15 @@ TEST(ToolTime, ToldWhatIsWrong)
         char const* message;
     } const rows[] = {
         {{"1 / 0"}, 1, ""}, // the answer is: invalid
-        {{"1/2 + x"}, 2, "korvane: \"1/2 + x \" is not a time (character 7)\n"},
-        {{"(1"}, 2, "korvane: \"(1 \" lacks a ) (character 4)\n"},
-        {{"1/0"}, 2, "korvane: \"1/0 \" is not a timescale from 1 to 2147483647 (character 3)\n"},
-        {{"9223372036854775808"}, 2, "korvane: \"9223372036854775808 \" does not fit 64 bits"},
-        {{"9223372036854775807.1"}, 2, "korvane: \"9223372036854775807.1 \" does not fit 64 bits"},
+        {{"1/2 + x"}, 2, "korvane: \"1/2 + x\" is not a time (character 7)\n"},
+        {{"(1"}, 2, "korvane: \"(1\" lacks a ) (character 3)\n"},
+        {{"1/0"}, 2, "korvane: \"1/0\" is not a timescale from 1 to 2147483647 (character 3)\n"},
+        {{"9223372036854775808"}, 2, "korvane: \"9223372036854775808\" does not fit 64 bits"},
+        {{"9223372036854775807.1"}, 2, "korvane: \"9223372036854775807.1\" does not fit 64 bits"},
         {{std::string(101, '(') + "1"}, 2, "korvane: \"(((((((((("},
         {{"floor", "1"}, 2, "korvane: floor needs --frame\n"},
+        {{"floor", "1", "--frame", "0"}, 2, "korvane: --frame: \"0\" is not a length above zero\n"},
+        {{"sample", "inf", "--frame", "1/24"}, 1, "korvane: inf lies in no frame\n"},
         {{"remap", "1", "2"}, 2, "korvane: remap needs TIME OLD NEW\n"},
     };
     for (Row const& row : rows) {

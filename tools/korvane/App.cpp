@@ -25,23 +25,47 @@ std::string versionText()
            "." + std::to_string(version & 0xFF) + " (ABI " + std::to_string(KORVANE_ABI) + ")";
 }
 
+/// Puts a paragraph behind what a command's help says so far.
+void addParagraph(CLI::App& command, std::string const& text)
+{
+    std::string const before = command.get_footer();
+    command.footer(before.empty() ? text : before + "\n\n" + text);
+}
+
+/// What the help of every command has in common: the exit codes, and arguments that are told by
+/// their names alone.
+void finish(CLI::App& command)
+{
+    addParagraph(command, exitCodes);
+    for (CLI::Option* argument :
+         command.get_options([](CLI::Option* option) { return option->get_positional(); }))
+        argument->type_name("");
+    for (CLI::App* below : command.get_subcommands([](CLI::App*) { return true; }))
+        finish(*below);
+}
+
 } // namespace
 
-void addExamples(CLI::App& family, std::string const& lines)
+void addExamples(CLI::App& command, std::initializer_list<char const*> lines)
 {
-    family.footer("Examples:\n" + lines + "\n\n" + family.get_footer());
+    std::string text = "Examples:";
+    for (char const* line : lines)
+        text += std::string("\n  ") + line;
+    addParagraph(command, text);
 }
 
 std::unique_ptr<CLI::App> makeApp()
 {
     auto app =
-        std::make_unique<CLI::App>("Reads, checks and writes what the library handles.", "korvane");
+        std::make_unique<CLI::App>("Read, check and write what the library handles", "korvane");
     app->set_version_flag("--version", versionText(),
                           "Print the version and the binary interface's");
     app->set_help_all_flag("--help-all", "Print the help of every command");
     app->require_subcommand(1);
-    app->footer(exitCodes);
     for (AddCommands add : commandFamilies)
         add(*app);
+    addExamples(*app, {"korvane scene show showreel.vzml",
+                       "korvane report showreel.vzml lighthouse.srt -o report.html"});
+    finish(*app);
     return app;
 }

@@ -127,6 +127,15 @@ std::string const& AtomicOutput::temporaryPath() const
     return temporary_;
 }
 
+void AtomicOutput::fail(int error)
+{
+    buffer_.clear();
+    discard();
+    if (error == EPIPE)
+        throw ToolError(ExitCode::InputOutput, ""); // the reader has had enough: nothing to say
+    throw inputOutput(path_ == "-" ? "standard output" : path_, error);
+}
+
 void AtomicOutput::commit()
 {
     flush();
@@ -171,15 +180,6 @@ void AtomicOutput::discard() noexcept
         temporary_.clear();
         setTemporaryToRemove("");
     }
-}
-
-void AtomicOutput::fail(int error)
-{
-    buffer_.clear();
-    discard();
-    if (error == EPIPE)
-        throw ToolError(ExitCode::InputOutput, ""); // the reader has had enough: nothing to say
-    throw inputOutput(path_ == "-" ? "standard output" : path_, error);
 }
 
 void printOutput(std::string_view text)

@@ -31,13 +31,18 @@ public:
     /// temporary file. Throws where the bytes go out directly, as to standard output.
     std::string const& temporaryPath() const;
 
+    /// Where library code that has a descriptor to write to is to write, instead of `write`. It
+    /// leaves it open; what it fails with is for `fail`.
+    int descriptor() const noexcept { return fd_; }
+    /// Gives the output up and throws, with what the system says about `error`, an `errno` value.
+    [[noreturn]] void fail(int error);
+
     /// Writes what is still held back and makes the target whole. Nothing is written after.
     void commit();
 
 private:
     void flush();
     void discard() noexcept;
-    [[noreturn]] void fail(int error);
 
     std::string path_;      // as given, for messages
     std::string target_;    // with symbolic links followed

@@ -2,12 +2,15 @@
 
 #include "ToolError.h"
 
+#include <korvane/foundation/KVString.h>
+
 #include <cerrno>
 #include <fcntl.h>
 #include <string_view>
 #include <sys/mman.h>
 #include <sys/stat.h>
 #include <unistd.h>
+#include <utility>
 
 namespace {
 
@@ -31,6 +34,8 @@ public:
     ~Descriptor() { close(); }
 
     int get() const noexcept { return fd_; }
+    /// The same, left to the caller.
+    int release() noexcept { return std::exchange(fd_, -1); }
 
 private:
     void close() noexcept
@@ -43,11 +48,14 @@ private:
     int fd_;
 };
 
-} // namespace
-
-std::string readFile(std::string const& path)
+bool isPipe(int fd)
 {
-    Descriptor const file(path);
+    struct stat status;
+    return fstat(fd, &status) == 0 && S_ISFIFO(status.st_mode);
+}
+
+std::string readAll(Descriptor const& file, std::string const& path)
+{
     std::string bytes;
     struct stat status;
     if (fstat(file.get(), &status) == 0 && S_ISREG(status.st_mode))
@@ -65,30 +73,40 @@ std::string readFile(std::string const& path)
     }
 }
 
-void checkReadable(std::string const& path)
+/// A file without a name in any folder that holds these bytes.
+int fileInMemory(std::string_view bytes, std::string const& path)
 {
-    Descriptor const file(path);
+    int const fd = memfd_create("korvane", MFD_CLOEXEC);
+    if (fd < 0)
+        throw inputOutput(path, errno);
+    while (!bytes.empty()) {
+        ssize_t const count = write(fd, bytes.data(), bytes.size());
+        if (count < 0) {
+            int const error = errno;
+            close(fd);
+            throw inputOutput(path, error);
+        }
+        bytes.remove_prefix(static_cast<std::size_t>(count));
+    }
+    return fd;
+}
+
+} // namespace
+
+std::string readFile(std::string const& path)
+{
+    return readAll(Descriptor(path), path);
 }
 
 ReopenableFile::ReopenableFile(std::string const& path) : shown_(path), path_(path)
 {
-    if (path != "-") {
-        checkReadable(path);
+    Descriptor file(path);
+    if (path == "-" || isPipe(file.get()))
+        fd_ = fileInMemory(readAll(file, path), path);
+    else if (KVString::fromUTF8(path).isNull())
+        fd_ = file.release();
+    else
         return;
-    }
-    std::string const bytes = readFile(path);
-    fd_ = memfd_create("korvane", MFD_CLOEXEC);
-    if (fd_ < 0)
-        throw inputOutput(path, errno);
-    for (std::string_view rest(bytes); !rest.empty();) {
-        ssize_t const count = write(fd_, rest.data(), rest.size());
-        if (count < 0) {
-            int const error = errno;
-            close(fd_);
-            throw inputOutput(path, error);
-        }
-        rest.remove_prefix(static_cast<std::size_t>(count));
-    }
     path_ = "/proc/self/fd/" + std::to_string(fd_);
 }
 
@@ -96,4 +114,20 @@ ReopenableFile::~ReopenableFile()
 {
     if (fd_ >= 0)
         close(fd_);
+}
+
+QuietLibrary::QuietLibrary() : standardError_(fcntl(STDERR_FILENO, F_DUPFD_CLOEXEC, 3))
+{
+    if (int const nowhere = open("/dev/null", O_WRONLY | O_CLOEXEC); nowhere >= 0) {
+        dup2(nowhere, STDERR_FILENO);
+        close(nowhere);
+    }
+}
+
+QuietLibrary::~QuietLibrary()
+{
+    if (standardError_ >= 0) {
+        dup2(standardError_, STDERR_FILENO);
+        close(standardError_);
+    }
 }

@@ -21,7 +21,7 @@ ToolError refusal(ReopenableFile const& file, int code, unsigned int format, uns
 /// The number of a descriptor is no title.
 cc::lut_t withoutBorrowedName(ReopenableFile const& file, cc::lut_t lut)
 {
-    if (file.isStandardInput()) {
+    if (file.isRenamed()) {
         if (lut.title == lut.name)
             lut.title.clear();
         lut.name.clear();
@@ -61,6 +61,7 @@ std::vector<cc::lut_t> readLuts(ReopenableFile const& file)
 
 bool looksLikeLut(ReopenableFile const& file)
 {
+    QuietLibrary const quiet;
     cc::lut_t lut;
     lut.read(file.path().c_str(), 0);
     return lut.format() != 0;

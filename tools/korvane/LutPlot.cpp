@@ -150,14 +150,16 @@ std::string plotLut(cc::lut_t const& table, cc::lut_t::processor_t const& lookup
     Domain const domain(table);
     bool const isCube = table.kind == cc::lut_t::k3D;
     std::string const size = std::to_string(table.size);
-    std::string svg = "<svg xmlns=\"http://www.w3.org/2000/svg\" width=\"" + std::to_string(width) +
-                      "\" height=\"" + std::to_string(height) + "\" viewBox=\"0 0 " +
-                      std::to_string(width) + " " + std::to_string(height) +
-                      "\" font-family=\"sans-serif\" font-size=\"12\">\n"
-                      "<rect width=\"100%\" height=\"100%\" fill=\"white\"/>\n";
-    svg +=
-        text(left, 30, "start",
-             table.title + (isCube ? " (" + size + " x " + size + " x " + size + ")" : " (curve)"));
+    std::string const title =
+        clipped(table.title, 60) +
+        (isCube ? " (" + size + " x " + size + " x " + size + ")" : " (curve)");
+    std::string const w = std::to_string(width), h = std::to_string(height);
+    std::string const svg = "<svg xmlns=\"http://www.w3.org/2000/svg\" role=\"img\" width=\"" + w +
+                            "\" height=\"" + h + "\" viewBox=\"0 0 " + w + " " + h +
+                            "\" font-family=\"sans-serif\" font-size=\"12\">\n<title>" +
+                            escaped(title) +
+                            "</title>\n<rect width=\"100%\" height=\"100%\" fill=\"white\"/>\n" +
+                            text(left, 30, "start", title);
     std::string curves = lutCurves(table, lookup), side;
     if (isCube) {
         curves += text(panel / 2, panel + 18, "middle", "along the neutral axis");

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <filesystem>
 #include <iterator>
 #include <map>
 
@@ -213,11 +214,11 @@ private:
 
 void openMovie(KVAtomBoxFile& file, std::string const& path)
 {
-    checkReadable(path);
-    KVURL const url(path.c_str());
-    if (url.isNull())
-        throw inputOutput(path, "its name is not UTF-8");
-    if (file.openInputFile(url.cf_url()) != 0)
+    std::error_code error;
+    if (path == "-" || std::filesystem::is_fifo(path, error))
+        throw inputOutput(path, "a movie is gone through more than once: it must be a file");
+    ReopenableFile const reopenable(path);
+    if (file.openInputFile(KVURL(reopenable.path().c_str()).cf_url()) != 0)
         throw badInput(path, "is empty, or no regular file");
     if (file.readTopLevelAtomBoxHeaders() != 0 || file.getChildCount() == 0)
         throw badInput(path, "is no QuickTime or MP4 file");

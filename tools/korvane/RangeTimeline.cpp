@@ -46,12 +46,6 @@ private:
     double first_ = INFINITY, last_ = -INFINITY;
 };
 
-std::string nameOf(VexTimeRangeObj const* range)
-{
-    auto const* owner = dynamic_cast<VexTimeRangeAndObject const*>(range);
-    return owner && owner->object() ? owner->object()->description().toUTF8() : std::string();
-}
-
 /// A range's place on a row, in units of a column.
 struct Bar {
     VexTimeRangeObj const* range;
@@ -108,6 +102,12 @@ std::string secondsText(double seconds)
 
 } // namespace
 
+std::string nameOf(VexTimeRangeObj const* range)
+{
+    auto const* owner = dynamic_cast<VexTimeRangeAndObject const*>(range);
+    return owner && owner->object() ? owner->object()->description().toUTF8() : std::string();
+}
+
 std::string timelineText(std::vector<TimelineSet> const& sets, std::size_t columns)
 {
     Scale const scale(sets);
@@ -152,7 +152,7 @@ std::string timelineSvg(std::vector<TimelineSet> const& sets)
                         "\" height=\"20\" fill=\"" + colours[i % std::size(colours)] +
                         "\" stroke=\"#fff\"/><title>" + escaped(bar.range->description().toUTF8()) +
                         "</title>";
-                if (bar.to - bar.from > 8 * name.size())
+                if (!name.empty() && bar.to - bar.from > 8 * name.size())
                     body += "<text fill=\"#fff\" x=\"" + std::to_string(margin + bar.from + 5) +
                             "\" y=\"" + std::to_string(y + 15) + "\">" + escaped(name) + "</text>";
                 body += "</g>\n";
@@ -165,7 +165,10 @@ std::string timelineSvg(std::vector<TimelineSet> const& sets)
             secondsText(scale.first()) + " s</text>\n<text text-anchor=\"end\" x=\"" +
             std::to_string(margin + columns) + "\" y=\"" + std::to_string(y) + "\">" +
             secondsText(scale.last()) + " s</text>\n";
-    return "<svg xmlns=\"http://www.w3.org/2000/svg\" width=\"" +
-           std::to_string(margin + columns + 10) + "\" height=\"" + std::to_string(y + 10) +
-           "\" font-family=\"sans-serif\" font-size=\"13\">\n" + body + "</svg>\n";
+    std::string const width = std::to_string(margin + columns + 10);
+    std::string const height = std::to_string(y + 10);
+    return "<svg xmlns=\"http://www.w3.org/2000/svg\" role=\"img\" width=\"" + width +
+           "\" height=\"" + height + "\" viewBox=\"0 0 " + width + " " + height +
+           "\" font-family=\"sans-serif\" font-size=\"13\">\n<title>Time ranges</title>\n" + body +
+           "</svg>\n";
 }

@@ -5,6 +5,9 @@
 #include <string>
 #include <vector>
 
+/// The name of a range; empty where it has none.
+std::string nameOf(VexTimeRangeObj const* range);
+
 /// Sets of ranges drawn one below the other, each with what it is called.
 struct TimelineSet {
     std::string label;

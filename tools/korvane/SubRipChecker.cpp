@@ -1,10 +1,12 @@
 #include "SubRipChecker.h"
 
+#include "TimeForms.h"
+#include "ToolError.h"
+
 #include <korvane/korvane.h>
 
 #include <algorithm>
 #include <array>
-#include <cstdlib>
 #include <optional>
 
 namespace {
@@ -35,20 +37,19 @@ bool isUTF8(std::string_view text)
     return !KVString::fromUTF8(text).isNull();
 }
 
-/// A piece of the file between quotes, short enough for a message.
-std::string quoted(std::string_view text)
+/// A piece of the file between quotes, short enough for a message, and in one line.
+std::string excerpt(std::string_view text)
 {
     constexpr std::size_t most = 60;
     std::size_t length = std::min(text.size(), most);
     while (length < text.size() && length > 0 && (text[length] & 0xC0) == 0x80)
         --length;
-    return '"' + std::string(text.substr(0, length)) + (length < text.size() ? "..." : "") + '"';
+    return '"' + inOneLine(text.substr(0, length)) + (length < text.size() ? "..." : "") + '"';
 }
 
 std::string timecode(long long milliseconds)
 {
-    double const seconds = static_cast<double>(std::llabs(milliseconds)) / 1000;
-    return (milliseconds < 0 ? "-" : "") + KVTimecodeStringFromTimeInSeconds(seconds).toUTF8();
+    return timecodeText(static_cast<double>(milliseconds) / 1000);
 }
 
 // --- Times, forgivingly ---
@@ -392,7 +393,7 @@ private:
             report(i + 1, error, "number", "number " + std::to_string(number),
                    std::to_string(expectedNumber_), "numbered anew from here on");
         } else if (!std::all_of(line(i).begin(), line(i).end(), isDigit)) {
-            report(i + 1, error, "number", quoted(line(i)), "the digits alone", "digits kept");
+            report(i + 1, error, "number", excerpt(line(i)), "the digits alone", "digits kept");
         }
         expectedNumber_ = number + 1;
         std::size_t times = i + 1;
@@ -409,10 +410,10 @@ private:
     void strayLine(std::size_t i)
     {
         if (check_.captions.empty() || !lastCaptionIsWhole_) {
-            report(i + 1, error, "stray text", quoted(line(i)), "a caption's number", "left out");
+            report(i + 1, error, "stray text", excerpt(line(i)), "a caption's number", "left out");
             return;
         }
-        report(i + 1, error, "stray text", "text behind an empty line: " + quoted(line(i)),
+        report(i + 1, error, "stray text", "text behind an empty line: " + excerpt(line(i)),
                "a caption's number", "joined to the text before");
         SubRipCaption& caption = check_.captions.back();
         caption.text += (caption.text.empty() ? "" : "\n") + lines_[i];
@@ -471,7 +472,7 @@ private:
         std::string_view const whole = line(i);
         Arrow const arrow = *findArrow(whole);
         if (whole.substr(arrow.position, arrow.length) != "-->") {
-            report(i + 1, error, "time line", quoted(whole.substr(arrow.position, arrow.length)),
+            report(i + 1, error, "time line", excerpt(whole.substr(arrow.position, arrow.length)),
                    "\"-->\"", "replaced");
         }
         std::string_view const parts[2] = {
@@ -481,14 +482,14 @@ private:
         for (std::size_t part = 0; part < 2; ++part) {
             auto const time = looseTime(parts[part]);
             if (!time) {
-                report(i + 1, error, "time", quoted(parts[part]),
+                report(i + 1, error, "time", excerpt(parts[part]),
                        "hours:minutes:seconds,milliseconds", "the caption is left out");
                 return std::nullopt;
             }
             times[part] = time->milliseconds;
             if (!time->complaint.empty()) {
                 report(i + 1, time->isError ? error : warning, "time",
-                       quoted(parts[part]) + ", which " + time->complaint, timecode(times[part]),
+                       excerpt(parts[part]) + ", which " + time->complaint, timecode(times[part]),
                        "written as " + timecode(std::max(times[part], 0LL)));
             }
         }
@@ -507,7 +508,7 @@ private:
         if (place == text.npos)
             return text;
         report(i + 1, error, "time line",
-               "a placement behind the times: " + quoted(text.substr(place)), "the times alone",
+               "a placement behind the times: " + excerpt(text.substr(place)), "the times alone",
                "left out");
         return text.substr(0, place);
     }
@@ -531,13 +532,13 @@ private:
             bool const isOpened = tag[0] == '<' || tag[0] == '{';
             if (kind == Importer::unknownTag && tag != "</font>") {
                 report(lineNumber, warning, "tag",
-                       "the unknown tag " + quoted(tag) + ", which is dropped",
+                       "the unknown tag " + excerpt(tag) + ", which is dropped",
                        "<b>, <i>, <u>, <br> or <font color=\"...\">");
             } else if (kind == Importer::notATag && isOpened) {
                 bool const isClosed = tag.size() > 1 && (tag.back() == '>' || tag.back() == '}');
                 report(lineNumber, warning, "tag",
-                       isClosed ? quoted(tag) + ", which is no tag but text"
-                                : "an opened bracket that nothing closes: " + quoted(tag),
+                       isClosed ? excerpt(tag) + ", which is no tag but text"
+                                : "an opened bracket that nothing closes: " + excerpt(tag),
                        isClosed ? "a known tag" : "\">\" or \"}\"");
             } else if (kind >= Importer::boldOn && kind <= Importer::underlineOff) {
                 Style& style = styles[(kind - Importer::boldOn) / 2];
@@ -545,7 +546,7 @@ private:
                 if (opens && style.open++ == 0)
                     style.line = lineNumber;
                 else if (!opens && --style.open < 0)
-                    report(lineNumber, warning, "tag", quoted(tag) + " without an opening tag",
+                    report(lineNumber, warning, "tag", excerpt(tag) + " without an opening tag",
                            std::string("<") + style.name + "> before it");
             }
             lineNumber += static_cast<std::size_t>(std::count(tag.begin(), tag.end(), '\n'));

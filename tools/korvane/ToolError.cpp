@@ -1,31 +1,28 @@
 #include "ToolError.h"
 
+#include <algorithm>
 #include <iostream>
 #include <system_error>
 
-namespace {
-
-std::string nameOf(std::string_view path)
+std::string inputName(std::string_view path)
 {
     return path == "-" ? "standard input" : std::string(path);
 }
 
-} // namespace
-
 ToolError badInput(std::string_view path, std::string_view text)
 {
-    return {ExitCode::BadInput, nameOf(path).append(": ").append(text)};
+    return {ExitCode::BadInput, inputName(path).append(": ").append(text)};
 }
 
 ToolError badInput(std::string_view path, unsigned long line, std::string_view text)
 {
     return {ExitCode::BadInput,
-            nameOf(path).append(":").append(std::to_string(line)).append(": ").append(text)};
+            inputName(path).append(":").append(std::to_string(line)).append(": ").append(text)};
 }
 
 ToolError inputOutput(std::string_view path, std::string_view text)
 {
-    return {ExitCode::InputOutput, nameOf(path).append(": ").append(text)};
+    return {ExitCode::InputOutput, inputName(path).append(": ").append(text)};
 }
 
 ToolError inputOutput(std::string_view path, int error)
@@ -33,7 +30,16 @@ ToolError inputOutput(std::string_view path, int error)
     return inputOutput(path, std::generic_category().message(error));
 }
 
+std::string inOneLine(std::string_view text)
+{
+    std::string line(text);
+    std::replace_if(
+        line.begin(), line.end(),
+        [](char c) { return static_cast<unsigned char>(c) < ' ' || c == '\x7F'; }, '?');
+    return line;
+}
+
 void printMessage(std::string_view message)
 {
-    std::cerr << "korvane: " << message << '\n';
+    std::cerr << "korvane: " << inOneLine(message) << '\n';
 }

@@ -26,7 +26,10 @@ private:
     ExitCode code_;
 };
 
-/// Code 3, `PATH: text`; "-" shows as "standard input".
+/// What messages call an input: "standard input" for "-", else its path.
+std::string inputName(std::string_view path);
+
+/// Code 3, `PATH: text`.
 ToolError badInput(std::string_view path, std::string_view text);
 /// Code 3, `PATH:LINE: text`; lines count from 1.
 ToolError badInput(std::string_view path, unsigned long line, std::string_view text);
@@ -35,5 +38,8 @@ ToolError inputOutput(std::string_view path, std::string_view text);
 /// Code 4, `PATH: ` and what the system says about `error`, an `errno` value.
 ToolError inputOutput(std::string_view path, int error);
 
-/// A message on standard error, behind `korvane: `: a warning, or a line that is not the last.
+/// A text from a file, or a file's name, in one line: "?" for each control character.
+std::string inOneLine(std::string_view text);
+
+/// A message on standard error, in one line behind `korvane: `.
 void printMessage(std::string_view message);

@@ -138,10 +138,8 @@ void addProperties(CLI::App& family)
     auto const options = std::make_shared<Options>();
     auto& command = *family.add_subcommand(
         "properties", "Tell what a compositor may rely on: yes, no, or - where there is no answer");
-    command
-        .add_option("MODE", options->modes,
-                    "Modes by number or constant (add, KV_BLEND_ADD); all if left out")
-        ->type_name("");
+    command.add_option("MODE", options->modes,
+                       "Modes by number or constant (add, KV_BLEND_ADD); all if left out");
     addJsonFlag(command, options->json);
     command.callback([options] { tell(options->modes, options->json); });
 }
@@ -150,11 +148,10 @@ void addProperties(CLI::App& family)
 
 void addBlendCommands(CLI::App& program)
 {
-    auto& family = *program.add_subcommand("blend", "Blend modes: their menus and properties");
+    auto& family = *program.add_subcommand("blend", "List blend modes and their properties");
     family.require_subcommand(1);
     addList(family);
     addProperties(family);
 
-    addExamples(family, "  korvane blend list --layer\n"
-                        "  korvane blend properties add multiply");
+    addExamples(family, {"korvane blend list --layer", "korvane blend properties add multiply"});
 }

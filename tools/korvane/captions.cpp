@@ -172,7 +172,7 @@ double endOf(KVCaption const* caption)
 }
 
 /// A caption's text in one line, " / " for a line end.
-std::string inOneLine(std::string text)
+std::string withSlashes(std::string text)
 {
     for (std::size_t i = 0; (i = text.find('\n', i)) != text.npos; i += 3)
         text.replace(i, 1, " / ");
@@ -211,7 +211,7 @@ void show(ShowOptions const& options)
         std::string const digits = std::to_string(number);
         table += std::string(digits.size() < 4 ? 4 - digits.size() : 0, ' ') + digits + "  " +
                  timecodeText(startOf(caption)) + "  " + timecodeText(endOf(caption)) + "  " +
-                 inOneLine(options.tags ? tagged : text) + "\n";
+                 withSlashes(options.tags ? tagged : text) + "\n";
     }
     if (options.json)
         printJson({{"file", options.file}, {"captions", std::move(list)}});
@@ -354,7 +354,8 @@ void check(CheckOptions const& options)
 
 void addCaptionsCommands(CLI::App& program)
 {
-    CLI::App& captions = *program.add_subcommand("captions", "SubRip captions");
+    CLI::App& captions =
+        *program.add_subcommand("captions", "List, move, explain and mend SubRip captions");
     captions.require_subcommand(1);
     char const* const frameHelp =
         "The length of a frame in seconds, such as 1001/24000; times go up to whole frames";
@@ -396,6 +397,6 @@ void addCaptionsCommands(CLI::App& program)
 
     addExamples(
         captions,
-        "  korvane captions check lighthouse.srt\n"
-        "  korvane captions convert lighthouse.srt later.srt --offset 2.5 --frame 1001/24000");
+        {"korvane captions check lighthouse.srt",
+         "korvane captions convert lighthouse.srt later.srt --offset 2.5 --frame 1001/24000"});
 }

@@ -1,6 +1,6 @@
 #pragma once
 
-#include <string>
+#include <initializer_list>
 
 namespace CLI {
 class App;
@@ -13,9 +13,9 @@ class App;
 /// A command's work is its callback. It throws ToolError to end with a message and an exit code.
 using AddCommands = void (*)(CLI::App& program);
 
-/// Puts command lines, two blanks in front of each, into the help of a family and the EXAMPLES of
-/// its manual page. A test runs them over examples/data.
-void addExamples(CLI::App& family, std::string const& lines);
+/// Puts command lines into the help of the program or a family, and into the EXAMPLES of its manual
+/// page. A test runs them over examples/data.
+void addExamples(CLI::App& command, std::initializer_list<char const*> lines);
 
 void addBlendCommands(CLI::App& program);
 void addCaptionsCommands(CLI::App& program);

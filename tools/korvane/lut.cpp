@@ -9,16 +9,12 @@
 
 #include <algorithm>
 #include <cctype>
-#include <cerrno>
 #include <charconv>
 #include <cmath>
 #include <filesystem>
 #include <map>
 #include <memory>
 #include <sstream>
-
-#include <fcntl.h>
-#include <unistd.h>
 
 namespace {
 
@@ -95,25 +91,14 @@ unsigned int formatFor(std::string const& path)
 void writeLut(cc::lut_t const& lut, std::string const& path, unsigned int format)
 {
     AtomicOutput output(path);
-    bool const direct =
-        path == "-" || (std::filesystem::exists(path) && !std::filesystem::is_regular_file(path));
-    int const fd = path == "-" ? ::dup(STDOUT_FILENO)
-                               : ::open(direct ? path.c_str() : output.temporaryPath().c_str(),
-                                        O_WRONLY | O_CLOEXEC);
-    if (fd < 0)
-        throw inputOutput(path, errno);
     std::string const stem = path == "-" ? "" : std::filesystem::path(path).stem();
     int error = 0;
     if (format == cc::lut_t::kMGA)
-        lut.writeMGA(fd, stem.c_str(), &error);
+        lut.writeMGA(output.descriptor(), stem.c_str(), &error);
     else
-        lut.writeCUBE(fd, stem.c_str(), &error);
-    if (::close(fd) != 0 && error == 0)
-        error = errno;
-    if (error == EPIPE)
-        throw ToolError(ExitCode::InputOutput, ""); // the reader has had enough: nothing to say
+        lut.writeCUBE(output.descriptor(), stem.c_str(), &error);
     if (error != 0)
-        throw inputOutput(path == "-" ? "standard output" : path, error);
+        output.fail(error);
     output.commit();
 }
 
@@ -224,6 +209,7 @@ void plot(std::string const& path, std::string const& out, unsigned long index, 
 void addIndex(CLI::App& command, unsigned long& index)
 {
     command.add_option("--index", index, "Which table of the file, 0 for the first")
+        ->check(CLI::NonNegativeNumber)
         ->type_name("N");
 }
 
@@ -245,7 +231,7 @@ void addInfo(CLI::App& family)
     auto const options = std::make_shared<Options>();
     auto& command = *family.add_subcommand(
         "info", "Tell kind, size, domain, title and range of values of a file's tables");
-    command.add_option("FILE", options->path, "A .cube or .mga file")->required()->type_name("");
+    command.add_option("FILE", options->path, "A .cube or .mga file")->required();
     addJsonFlag(command, options->json);
     command.callback([options] { info(options->path, options->json); });
 }
@@ -254,10 +240,9 @@ void addConvert(CLI::App& family)
 {
     auto const options = std::make_shared<ConvertOptions>();
     auto& command = *family.add_subcommand("convert", "Write a table in the other format or size");
-    command.add_option("IN", options->in, "A .cube or .mga file")->required()->type_name("");
+    command.add_option("IN", options->in, "A .cube or .mga file")->required();
     command.add_option("OUT", options->out, "The file to write; its extension chooses the format")
-        ->required()
-        ->type_name("");
+        ->required();
     static std::map<std::string, unsigned int> const formats = {{"cube", cc::lut_t::kCUBE},
                                                                 {"mga", cc::lut_t::kMGA}};
     command.add_option("--format", options->format, "The format, whatever OUT is called")
@@ -283,12 +268,10 @@ void addApply(CLI::App& family)
     };
     auto const options = std::make_shared<Options>();
     auto& command = *family.add_subcommand("apply", "Look colours up in a table");
-    command.add_option("FILE", options->path, "A .cube or .mga file")->required()->type_name("");
-    command
-        .add_option(
-            "COLOUR", options->words,
-            "Red, green and blue of each colour; left out, a colour a line of standard input")
-        ->type_name("");
+    command.add_option("FILE", options->path, "A .cube or .mga file")->required();
+    command.add_option(
+        "COLOUR", options->words,
+        "Red, green and blue of each colour; left out, a colour a line of standard input");
     addIndex(command, options->index);
     addMethod(command, options->interpolation);
     command.callback([options] {
@@ -306,8 +289,8 @@ void addPlot(CLI::App& family)
     };
     auto const options = std::make_shared<Options>();
     auto& command = *family.add_subcommand("plot", "Draw a table's curves and a slice of its cube");
-    command.add_option("FILE", options->path, "A .cube or .mga file")->required()->type_name("");
-    command.add_option("OUT", options->out, "The SVG file to write")->required()->type_name("");
+    command.add_option("FILE", options->path, "A .cube or .mga file")->required();
+    command.add_option("OUT", options->out, "The SVG file to write")->required();
     command.add_option("--slice", options->slice, "Where blue is cut, 0 to 1 over the domain")
         ->check(CLI::Range(0.0f, 1.0f))
         ->type_name("X");
@@ -320,14 +303,15 @@ void addPlot(CLI::App& family)
 
 void addLutCommands(CLI::App& program)
 {
-    auto& family = *program.add_subcommand("lut", "Colour lookup tables: .cube and .mga files");
+    auto& family =
+        *program.add_subcommand("lut", "Show, convert, apply and draw colour lookup tables");
     family.require_subcommand(1);
     addInfo(family);
     addConvert(family);
     addApply(family);
     addPlot(family);
 
-    addExamples(family, "  korvane lut info warm-evening.cube\n"
-                        "  korvane lut convert warm-evening.cube warm-evening.mga --size 33\n"
-                        "  korvane lut apply warm-evening.cube 0.5 0.4 0.3");
+    addExamples(family, {"korvane lut info warm-evening.cube",
+                         "korvane lut convert warm-evening.cube warm-evening.mga --size 33",
+                         "korvane lut apply warm-evening.cube 0.5 0.4 0.3"});
 }

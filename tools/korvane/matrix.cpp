@@ -19,7 +19,7 @@ class MatrixArgument {
 public:
     void addTo(CLI::App& command, std::string const& description)
     {
-        command.add_option("MATRIX", words_, description)->type_name("");
+        command.add_option("MATRIX", words_, description);
     }
     bool isGiven() const { return !words_.empty(); }
 
@@ -179,7 +179,7 @@ void addMatrixCommands(CLI::App& program)
     addInvert(family);
     addCompose(family);
 
-    addExamples(family, "  korvane matrix decompose camera.txt\n"
-                        "  korvane matrix compose --rotate 0 30 0 --translate 3.2 1.65 -7.4 | "
-                        "korvane matrix invert -");
+    addExamples(family, {"korvane matrix decompose camera.txt",
+                         "korvane matrix compose --rotate 0 30 0 --translate 3.2 1.65 -7.4 | "
+                         "korvane matrix invert -"});
 }

@@ -102,12 +102,6 @@ VexTimeRangeArray readSet(std::string const& set)
     return isList ? readList(set) : readRangeFile(set);
 }
 
-std::string nameOf(VexTimeRangeObj const* range)
-{
-    auto const* owner = dynamic_cast<VexTimeRangeAndObject const*>(range);
-    return owner ? owner->object()->description().toUTF8() : std::string();
-}
-
 std::string listText(VexTimeRangeArray const& ranges)
 {
     std::string text;
@@ -202,20 +196,19 @@ void addRangesCommands(CLI::App& program)
     struct Row {
         char const *name, *description;
         SetOperation operation;
-        int least, most;
+        int least, most; ///< sets; -1 where there is no end
     } const rows[] = {
-        {"union", "All sets as one, overlapping ranges joined", joined, 1, 26},
-        {"subtract", "The pieces of the first set outside the others", subtracted, 2, 26},
+        {"union", "All sets as one, overlapping ranges joined", joined, 1, -1},
+        {"subtract", "The pieces of the first set outside the others", subtracted, 2, -1},
         {"mask", "The pieces of the first set inside the second", masked, 2, 2},
-        {"show", "Draw the sets as they are", nullptr, 1, 26},
+        {"show", "Draw the sets as they are", nullptr, 1, -1},
     };
     for (Row const& row : rows) {
         auto options = std::make_shared<RangesOptions>();
         CLI::App& command = *ranges.add_subcommand(row.name, row.description);
         command.add_option("SET", options->sets, "A list of ranges, or a file of them")
             ->required()
-            ->expected(row.least, row.most)
-            ->type_name("");
+            ->expected(row.least, row.most);
         if (row.operation == joined)
             command.add_flag("--apart", options->apart, "Join only ranges of the same name");
         options->timeline = row.operation == nullptr;
@@ -224,9 +217,8 @@ void addRangesCommands(CLI::App& program)
         command.add_option("--svg", options->svg, "Draw them as a picture as well")
             ->type_name("FILE");
         addJsonFlag(command, options->json);
-        command.footer(rangesFooter);
         command.callback([options, operation = row.operation] { runRanges(*options, operation); });
     }
 
-    addExamples(ranges, "  korvane ranges subtract 0..10=interview 3..4 --timeline");
+    addExamples(ranges, {"korvane ranges subtract 0..10=interview 3..4 --timeline"});
 }

@@ -14,7 +14,7 @@
 #include <algorithm>
 #include <filesystem>
 #include <memory>
-#include <set>
+#include <optional>
 #include <string_view>
 
 namespace {
@@ -116,9 +116,21 @@ struct Options {
 ToolError renamed(ToolError const& error, ReopenableFile const& file)
 {
     std::string message = error.what();
-    if (file.isStandardInput() && message.starts_with(file.path()))
-        message.replace(0, file.path().size(), "standard input");
+    if (message.starts_with(file.path() + ":"))
+        message.replace(0, file.path().size(), inputName(file.shown()));
     return {error.code(), message};
+}
+
+void checkPaths(Options const& options)
+{
+    std::vector<std::string> inputs = options.files;
+    inputs.push_back(options.before);
+    if (std::ranges::count(inputs, "-") > 1)
+        throw ToolError(ExitCode::Usage, "standard input can be read once only");
+    for (std::string const& input : inputs)
+        if (FileBytes::isSameFile(input, options.output))
+            throw ToolError(ExitCode::Usage,
+                            options.output + ": is an input; write to another file");
 }
 
 std::string htmlOf(ReopenableFile const& file, FileKind kind, std::string const& id,
@@ -140,8 +152,10 @@ std::string htmlOf(ReopenableFile const& file, FileKind kind, std::string const&
 
 void report(Options const& options)
 {
-    if (std::ranges::count(options.files, "-") > 1)
-        throw ToolError(ExitCode::Usage, "standard input can be read once only");
+    checkPaths(options);
+    std::optional<ReopenableFile> before;
+    if (!options.before.empty())
+        before.emplace(options.before);
     std::vector<ReportSection> sections;
     bool hasMovie = false;
     for (std::string const& path : options.files) {
@@ -149,16 +163,16 @@ void report(Options const& options)
         try {
             FileKind const kind = kindOf(file);
             hasMovie |= kind == FileKind::Movie;
-            std::string const name = file.isStandardInput()
-                                         ? "standard input"
-                                         : std::filesystem::path(path).filename().string();
+            std::string const name = std::filesystem::path(inputName(path)).filename().string();
             std::string const id = "f" + std::to_string(sections.size() + 1);
-            sections.push_back({name, nameOf(kind), htmlOf(file, kind, id, options.before)});
+            std::string const original = before ? before->path() : "";
+            sections.push_back({name, nameOf(kind), htmlOf(file, kind, id, original)});
         } catch (ToolError const& error) {
-            throw renamed(error, file);
+            ToolError const own = renamed(error, file);
+            throw before ? renamed(own, *before) : own;
         }
     }
-    if (!options.before.empty() && !hasMovie)
+    if (before && !hasMovie)
         throw ToolError(ExitCode::Usage, "--before is for movies, and none of the files is one");
     AtomicOutput output(options.output);
     output.write(reportPage(sections));
@@ -171,7 +185,7 @@ void addReportCommands(CLI::App& program)
 {
     auto const options = std::make_shared<Options>();
     CLI::App& command =
-        *program.add_subcommand("report", "Show files as pictures, on one HTML page");
+        *program.add_subcommand("report", "Show files of all kinds as pictures on one HTML page");
     command.add_option("FILE", options->files, "Scenes, captions, LUTs, movies and matrices, or -")
         ->required();
     command.add_option("-o,--output", options->output, "The page to write, or -")
@@ -185,4 +199,9 @@ void addReportCommands(CLI::App& program)
                    "Of very large files the page shows the whole in a coarser picture, and the\n"
                    "first rows of its tables, and tells how many more there are.");
     command.callback([options] { report(*options); });
+
+    addExamples(command,
+                {"korvane report showreel.vzml lighthouse.srt warm-evening.cube camera.txt "
+                 "-o report.html",
+                 "korvane report sphere.mp4 --before movie.mp4 -o changes.html"});
 }

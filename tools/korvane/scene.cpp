@@ -7,7 +7,6 @@
 
 #include <korvane/foundation/KVException.h>
 #include <korvane/serialization/KVBufferWriteStream.h>
-#include <korvane/serialization/KVFileWriteStream.h>
 
 #include <chrono>
 #include <map>
@@ -135,7 +134,7 @@ void check(std::string const& path, bool json)
         printJson(
             {{"file", path}, {"form", nameOf(document->form)}, {"findings", std::move(list)}});
     } else {
-        std::string const name = path == "-" ? "standard input" : path;
+        std::string const name = inputName(path);
         std::string text;
         for (scene::Finding const& finding : document->findings)
             text += name + ":" + (finding.line ? std::to_string(finding.line) + ":" : "") + " " +
@@ -299,7 +298,7 @@ void addSceneCommands(CLI::App& program)
     addJsonFlag(diffCommand, options->json);
     diffCommand.callback([options] { diff(options->file, options->output, options->json); });
 
-    addExamples(family, "  korvane scene show showreel.vzml\n"
-                        "  korvane scene convert showreel.vzml showreel.vzb --to binary\n"
-                        "  korvane scene diff showreel.vzml showreel.vzb");
+    addExamples(family, {"korvane scene show showreel.vzml",
+                         "korvane scene convert showreel.vzml showreel.vzb --to binary",
+                         "korvane scene diff showreel.vzml showreel.vzb"});
 }

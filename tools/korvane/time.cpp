@@ -40,16 +40,26 @@ CMTime frameOf(TimeOptions const& options)
 {
     if (options.frame.empty())
         throw ToolError(ExitCode::Usage, options.words[0] + " needs --frame");
-    return evaluate(options.frame);
+    CMTime const frame = evaluate(options.frame);
+    if (!CMTimeIsNumeric(frame) || frame.value <= 0)
+        throw ToolError(ExitCode::Usage,
+                        "--frame: \"" + options.frame + "\" is not a length above zero");
+    return frame;
+}
+
+/// The words from one on as one expression.
+CMTime expression(TimeOptions const& options, std::size_t first)
+{
+    std::string text;
+    for (std::size_t i = first; i < options.words.size(); ++i)
+        text += (i > first ? " " : "") + options.words[i];
+    return evaluate(text);
 }
 
 /// All words but the first as one expression.
 CMTime argument(TimeOptions const& options)
 {
-    std::string text;
-    for (std::size_t i = 1; i < options.words.size(); ++i)
-        text += options.words[i] + " ";
-    return evaluate(text);
+    return expression(options, 1);
 }
 
 CMTime remap(TimeOptions const& options)
@@ -94,15 +104,16 @@ CMTime calculate(TimeOptions const& options)
         return reduced(argument(options));
     if (verb == "alias")
         return KV_CMTimeGetPreferredSampleDurationAlias(argument(options));
-    std::string text;
-    for (std::string const& word : options.words)
-        text += word + " ";
-    return evaluate(text);
+    return expression(options, 0);
 }
 
 void printSample(TimeOptions const& options)
 {
-    long long const sample = KV_CMTimeGetSampleNumber(argument(options), frameOf(options));
+    CMTime const time = argument(options);
+    CMTime const frame = frameOf(options);
+    if (!CMTimeIsNumeric(time))
+        throw ToolError(ExitCode::Failed, timeFraction(time) + " lies in no frame");
+    long long const sample = KV_CMTimeGetSampleNumber(time, frame);
     if (options.json)
         printJson({{"sample", sample}});
     else
@@ -146,9 +157,7 @@ void addTimeCommands(CLI::App& program)
 {
     auto options = std::make_shared<TimeOptions>();
     CLI::App& time = *program.add_subcommand("time", "Calculate with exact times");
-    time.add_option("EXPRESSION", options->words, "What to calculate, see below")
-        ->required()
-        ->type_name("");
+    time.add_option("EXPRESSION", options->words, "What to calculate")->required();
     time.add_option("--frame", options->frame, "The length of a frame in seconds")
         ->type_name("TIME");
     time.add_option("--times", options->times, "How often a sum takes its time")
@@ -159,6 +168,6 @@ void addTimeCommands(CLI::App& program)
     time.footer(timeFooter);
     time.callback([options] { runTime(*options); });
 
-    addExamples(time, "  korvane time \"1001/30000 * 30000\"\n"
-                      "  korvane time floor 3.52 --frame 1001/24000");
+    addExamples(time, {"korvane time \"1001/30000 * 30000\"",
+                       "korvane time floor 3.52 --frame 1001/24000"});
 }

@@ -2,7 +2,6 @@
 
 #include "../AtomicOutput.h"
 #include "../FileBytes.h"
-#include "../Input.h"
 #include "../Json.h"
 #include "../MovieRewrite.h"
 #include "../Progress.h"
@@ -151,7 +150,6 @@ void rewrite(KVAtomBoxFile& file, RewriteOptions const& options)
 
 void checkPaths(RewriteOptions const& options)
 {
-    checkReadable(options.input);
     if (FileBytes::isSameFile(options.input, options.output))
         throw ToolError(ExitCode::Usage, options.output + ": is the input; write to another file");
 }

@@ -19,7 +19,7 @@ struct RewriteOptions {
 
 void addRewriteOptions(CLI::App& command, RewriteOptions& options);
 
-/// Throws ToolError unless the input can be read and the output is another file.
+/// Throws ToolError when the output is the input, by whatever name.
 void checkPaths(RewriteOptions const& options);
 
 /// Throws ToolError when a sample description of the track does not come out of the library as it

@@ -2,6 +2,7 @@
 
 #include "../Input.h"
 #include "../Json.h"
+#include "../Markup.h"
 #include "../ToolError.h"
 #include "Commands.h"
 #include "Metadata.h"
@@ -110,9 +111,9 @@ void setProjection(SetOptions const& options, KVImageDescAtomBox& descriptions,
         else
             for (char const* key : kCubeKeys)
                 values->setValue(key, nullptr);
-        for (char const* key : {toCube ? kCubeKeys[0] : kBoundKeys[0]})
-            if (!values->value(key))
-                setValue(values, key, "0");
+        char const* const needed = toCube ? kCubeKeys[0] : kBoundKeys[0];
+        if (!values->value(needed))
+            setValue(values, needed, "0");
     }
     if (options.cubeLayout)
         setValue(values, kCubeKeys[0], std::to_string(*options.cubeLayout));
@@ -174,12 +175,7 @@ Values firstGenerationValues(SetOptions const& options, Values const& second)
              stereo == "1"   ? "top-bottom"
              : stereo == "2" ? "left-right"
                              : "mono");
-    setValue(values, "GSpherical:StitchingSoftware", [&] {
-        std::string escaped;
-        for (char const c : textOf("metadata_source"))
-            escaped += c == '&' ? "&amp;" : c == '<' ? "&lt;" : std::string(1, c);
-        return escaped;
-    }());
+    setValue(values, "GSpherical:StitchingSoftware", escaped(textOf("metadata_source")));
     for (auto const& [key, degrees] :
          {std::pair{"GSpherical:InitialViewHeadingDegrees", options.yaw},
           std::pair{"GSpherical:InitialViewPitchDegrees", options.pitch},
@@ -308,18 +304,23 @@ void addMediaSet(CLI::App& media)
     CLI::App& setCommand =
         *media.add_subcommand("set", "Copy a movie and give its first video track other metadata");
     addRewriteOptions(setCommand, *setOptions);
-    setCommand.add_option("--spherical", setOptions->spherical, "equirectangular or cubemap")
+    setCommand.add_option("--spherical", setOptions->spherical, "The projection")
         ->check(CLI::IsMember({"equirectangular", "cubemap"}));
-    setCommand.add_option("--stereo", setOptions->stereo, "mono, top-bottom, left-right or custom")
+    setCommand.add_option("--stereo", setOptions->stereo, "How the pictures of both eyes lie")
         ->check(CLI::IsMember({"mono", "top-bottom", "left-right", "custom"}));
-    setCommand.add_option("--yaw", setOptions->yaw, "Degrees, -180 to 180")
-        ->check(CLI::Range(-180.0, 180.0));
-    setCommand.add_option("--pitch", setOptions->pitch, "Degrees, -90 to 90")
-        ->check(CLI::Range(-90.0, 90.0));
-    setCommand.add_option("--roll", setOptions->roll, "Degrees, -180 to 180")
-        ->check(CLI::Range(-180.0, 180.0));
-    setCommand.add_option("--bounds", setOptions->bounds,
-                          "T,B,L,R: parts of the whole sphere that are cut off, each below 1");
+    setCommand.add_option("--yaw", setOptions->yaw, "How far the sphere turns about its vertical")
+        ->check(CLI::Range(-180.0, 180.0))
+        ->type_name("DEGREES");
+    setCommand.add_option("--pitch", setOptions->pitch, "How far it tilts")
+        ->check(CLI::Range(-90.0, 90.0))
+        ->type_name("DEGREES");
+    setCommand.add_option("--roll", setOptions->roll, "How far it turns about the line of sight")
+        ->check(CLI::Range(-180.0, 180.0))
+        ->type_name("DEGREES");
+    setCommand
+        .add_option("--bounds", setOptions->bounds,
+                    "Parts of the sphere cut off at the top, bottom, left and right, each below 1")
+        ->type_name("T,B,L,R");
     setCommand.add_option("--cube-layout", setOptions->cubeLayout, "The number of the layout")
         ->check(CLI::NonNegativeNumber);
     setCommand.add_option("--cube-padding", setOptions->cubePadding, "Pixels around each face")
@@ -331,9 +332,17 @@ void addMediaSet(CLI::App& media)
         .add_option("--hdr", setOptions->hdr,
                     "A JSON file of mastering display and content light numbers")
         ->type_name("FILE");
-    setCommand.add_option("--colour,--color", setOptions->colour,
-                          "P,T,M: primaries, transfer, matrix (ITU-T H.273)");
-    setCommand.add_option("--pixel-aspect", setOptions->pixelAspect, "H:V");
-    setCommand.add_option("--field", setOptions->field, "FIELDS,DETAIL");
+    setCommand
+        .add_option("--colour,--color", setOptions->colour,
+                    "Primaries, transfer and matrix of ITU-T H.273, such as 9,16,9")
+        ->type_name("P,T,M");
+    setCommand
+        .add_option("--pixel-aspect", setOptions->pixelAspect,
+                    "Width and height of a pixel, such as 4:3")
+        ->type_name("RATIO");
+    setCommand
+        .add_option("--field", setOptions->field,
+                    "The number of fields and their order, such as 2,9")
+        ->type_name("FIELDS,ORDER");
     setCommand.callback([setOptions] { set(*setOptions); });
 }

@@ -88,6 +88,13 @@ std::string legend(std::vector<LegendEntry> const& entries)
     return "<ul class=\"legend\">" + items + "</ul>\n";
 }
 
+std::string figure(std::string const& pictureHtml, std::string_view caption,
+                   std::string const& moreHtml)
+{
+    return "<figure>" + pictureHtml + "<figcaption>" + shownText(caption) + "</figcaption>" +
+           moreHtml + "</figure>\n";
+}
+
 std::string note(std::string_view text)
 {
     return "<p class=\"note\">" + shownText(text, 600) + "</p>\n";

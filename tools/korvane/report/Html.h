@@ -67,5 +67,9 @@ struct LegendEntry {
 };
 std::string legend(std::vector<LegendEntry> const& entries);
 
+/// A picture, what it shows, and what else stands below that.
+std::string figure(std::string const& pictureHtml, std::string_view caption,
+                   std::string const& moreHtml = {});
+
 /// "<p class="note">…</p>"
 std::string note(std::string_view text);

@@ -24,8 +24,7 @@ std::string panel(std::string const& drawing, int width, int height, std::string
     Svg svg(width, height);
     svg.add("<g transform=\"scale(" + decimal(width / double{lutPanel}, 4) + " " +
             decimal(height / double{lutPanel}, 4) + ")\">\n" + drawing + "</g>\n");
-    return "<figure>" + svg.html(id, title, description) + "<figcaption>" + shownText(title) +
-           "</figcaption></figure>\n";
+    return figure(svg.html(id, title, description), title);
 }
 
 std::string curvesHtml(cc::lut_t const& table, cc::lut_t::processor_t const& lookup,
@@ -38,14 +37,12 @@ std::string curvesHtml(cc::lut_t const& table, cc::lut_t::processor_t const& loo
     svg.text(margin - 10, 12 + lutPanel / 2.0, "out", "end soft");
     bool const isCube = table.kind == cc::lut_t::k3D;
     std::string const title = isCube ? "What becomes of greys, channel by channel" : "The curve";
-    return "<figure>" +
-           svg.html(id, title,
-                    "From " + shortest(table.domainMin) + " to " + shortest(table.domainMax) +
-                        " on both axes; a table without effect is the diagonal.") +
-           "<figcaption>" + title + "</figcaption>" +
-           (isCube ? legend({{"red", "red"}, {"green", "green"}, {"blue", "blue"}})
-                   : legend({{"all", "all channels"}})) +
-           "</figure>\n";
+    std::string const description = "From " + shortest(table.domainMin) + " to " +
+                                    shortest(table.domainMax) +
+                                    " on both axes; a table without effect is the diagonal.";
+    return figure(svg.html(id, title, description), title,
+                  isCube ? legend({{"red", "red"}, {"green", "green"}, {"blue", "blue"}})
+                         : legend({{"all", "all channels"}}));
 }
 
 std::string slicesHtml(cc::lut_t const& table, cc::lut_t::processor_t const& lookup,

@@ -128,11 +128,6 @@ std::string pictureHtml(Square const& square, double side, bool isLarge, std::st
     return svg.html(id, title, corners + ".");
 }
 
-std::string figure(std::string const& picture, std::string const& caption)
-{
-    return "<figure>" + picture + "<figcaption>" + shownText(caption) + "</figcaption></figure>\n";
-}
-
 std::string numbersHtml(Matrix const& matrix)
 {
     std::string html = "<div class=\"scroll\" tabindex=\"0\" role=\"region\" "

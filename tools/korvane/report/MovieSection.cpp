@@ -452,11 +452,12 @@ std::string movieHtml(ReopenableFile const& file, std::string const& id, std::st
         .add("Chunk offset tables", grouped(tables.size()));
     if (isCompared)
         facts.add("Size of the original", bytesText(oldLength));
-    std::string html = facts.html() + notes + "<h3>Map of the file</h3>\n" + legend(entries) +
-                       svg.html(id + "-map", "Map of the file",
-                                "The atoms of the file from left to right, to scale; those that "
-                                "would be too narrow to see are drawn wider. Below it moov, "
-                                "magnified, with what it contains. The table tells each atom.");
+    std::string html =
+        facts.html() + notes + "<h3>Map of the file</h3>\n" + legend(entries) +
+        svg.scrollHtml(id + "-map", "Map of the file",
+                       "The atoms of the file from left to right, to scale; those that "
+                       "would be too narrow to see are drawn wider. Below it moov, "
+                       "magnified, with what it contains. The table tells each atom.");
     if (magnified.leftOut() > 0)
         html += note("and " + grouped(magnified.leftOut()) +
                      " more atoms in it, for which the map has no room");

@@ -20,7 +20,7 @@ char const* const style = R"(
   --same: #e8ebef; --sames: #7b8794; --bad: #b3202c;
   --red: #c62430; --green: #1f8a3b; --blue: #2357d8;
 }
-@media (prefers-color-scheme: dark) {
+@media screen and (prefers-color-scheme: dark) {
   :root {
     --ground: #0e1217; --card: #161b22; --ink: #e7ebf0; --soft: #a3adb9; --edge: #303844;
     --grid: #262d37; --accent: #79b8ff; --head: #1d242d;
@@ -65,13 +65,11 @@ section {
 .panels figure { margin: 0; max-width: 100%; }
 .axes { flex: 0 0 100%; margin: 0; color: var(--soft); font-size: 13px; }
 .aside { flex: 1 1 340px; min-width: 0; max-width: 720px; gap: 12px 16px; }
-.panels .scroll > svg { max-width: 100%; height: auto; }
+.panels svg { max-width: 100%; height: auto; }
 figcaption { color: var(--soft); font-size: 13px; margin-top: 4px; max-width: 420px; }
 .legend { display: flex; flex-wrap: wrap; gap: 4px 16px; padding: 0; margin: 8px 0 10px; list-style: none; font-size: 13px; color: var(--soft); }
 .patch { vertical-align: -1px; margin-right: 6px; }
 details > summary { cursor: pointer; }
-details.more { margin-top: 12px; }
-details.more > summary { color: var(--accent); }
 .rows { max-height: 26em; overflow-y: auto; margin-top: 10px; border: 1px solid var(--edge); border-radius: 6px; }
 table { border-collapse: collapse; width: 100%; font-size: 13.5px; }
 caption { position: absolute; left: -9999px; }
@@ -80,6 +78,7 @@ th { position: sticky; top: 0; background: var(--head); color: var(--soft); font
 td.n, th.n { text-align: right; font-variant-numeric: tabular-nums; white-space: nowrap; }
 tfoot td { color: var(--soft); font-style: italic; }
 td:not(.n) { min-width: 7.5em; white-space: pre-line; }
+.rows td:not(.n):last-child { min-width: 15em; }
 tr.flag td, tr.gone td { background: color-mix(in srgb, var(--f4) 45%, transparent); }
 tr.changed td { background: color-mix(in srgb, var(--f1) 45%, transparent); }
 tr.new td { background: color-mix(in srgb, var(--f2) 45%, transparent); }
@@ -95,7 +94,6 @@ svg .soft { fill: var(--soft); font-size: 11px; }
 svg .small { font-size: 11px; }
 svg .mid { text-anchor: middle; }
 svg .end { text-anchor: end; }
-svg .strong { font-weight: 600; }
 .line { stroke: var(--grid); }
 .axisline { stroke: var(--sames); }
 .lane { fill: var(--head); }
@@ -120,7 +118,6 @@ rect.all { fill: var(--ink); }
 .frame { fill: none; stroke: var(--edge); }
 .unit { fill: none; stroke: var(--sames); stroke-dasharray: 5 4; stroke-width: 1.5; }
 .xaxis { stroke: var(--red); stroke-width: 2.5; fill: none; } .yaxis { stroke: var(--green); stroke-width: 2.5; fill: none; }
-svg text.bad { fill: var(--bad); }
 footer { color: var(--soft); font-size: 13px; margin-top: 24px; }
 @media (max-width: 600px) {
   body { padding: 0 10px 32px; }
@@ -136,7 +133,10 @@ footer { color: var(--soft); font-size: 13px; margin-top: 24px; }
   .scroll { overflow: visible; }
   .rows { max-height: none; border: 0; }
   .scroll > svg { max-width: 100%; height: auto; }
-  figure, tr { break-inside: avoid; }
+  h2, h3, .kind, .facts, .legend { break-after: avoid; }
+  .panels { display: block; }
+  .panels figure { display: inline-block; vertical-align: top; margin: 0 16px 12px 0; }
+  figure, tr, .matrix, .scroll > svg { break-inside: avoid; }
   ::details-content { content-visibility: visible; }
 }
 )";

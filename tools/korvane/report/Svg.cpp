@@ -17,11 +17,15 @@ std::string ending(char const* element, std::string_view tooltip)
     return "><title>" + escaped(tooltip) + "</title></" + element + ">\n";
 }
 
-/// By the first byte of a character: wide scripts begin behind U+2E80.
+/// By the first byte of a character, as common typefaces have them: wide scripts begin behind
+/// U+2E80.
 double widthOf(char lead)
 {
     auto const byte = static_cast<unsigned char>(lead);
-    return byte < 0x80 ? 6.7 : byte < 0xC0 ? 0 : byte < 0xE2 ? 7.2 : byte == 0xE2 ? 8 : 12.5;
+    if (byte >= 0x80)
+        return byte < 0xC0 ? 0 : byte < 0xE2 ? 7.4 : byte == 0xE2 ? 8 : 12.5;
+    constexpr std::string_view narrow = " !'()*,-./:;I[]fijlrt|", wide = "%@MWmw";
+    return narrow.find(lead) != narrow.npos ? 4.8 : wide.find(lead) != wide.npos ? 11.6 : 7.6;
 }
 
 } // namespace
@@ -55,12 +59,18 @@ std::string Svg::html(std::string const& id, std::string_view title,
                       std::string_view description) const
 {
     std::string const w = decimal(width_), h = decimal(height_);
-    return "<div class=\"scroll\" tabindex=\"0\" role=\"region\" aria-label=\"" + escaped(title) +
-           "\"><svg xmlns=\"http://www.w3.org/2000/svg\" role=\"img\" aria-labelledby=\"" + id +
+    return "<svg xmlns=\"http://www.w3.org/2000/svg\" role=\"img\" aria-labelledby=\"" + id +
            "-title " + id + "-desc\" width=\"" + w + "\" height=\"" + h + "\" viewBox=\"0 0 " + w +
            " " + h + "\">\n<title id=\"" + id + "-title\">" + escaped(title) +
            "</title>\n<desc id=\"" + id + "-desc\">" + escaped(description) + "</desc>\n" + body_ +
-           "</svg></div>\n";
+           "</svg>\n";
+}
+
+std::string Svg::scrollHtml(std::string const& id, std::string_view title,
+                            std::string_view description) const
+{
+    return "<div class=\"scroll\" tabindex=\"0\" role=\"region\" aria-label=\"" + escaped(title) +
+           "\">" + html(id, title, description) + "</div>\n";
 }
 
 double widthOf(std::string_view text)
@@ -75,7 +85,7 @@ std::string fitted(std::string_view text, double width)
 {
     if (widthOf(text) <= width)
         return std::string(text);
-    double used = widthOf('.') + 2; // the ellipsis
+    double used = 12; // the ellipsis
     std::size_t count = 0;
     for (char const c : text) {
         used += widthOf(c);

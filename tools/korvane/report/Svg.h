@@ -7,7 +7,7 @@
 ///
 ///     Svg svg(1100, 200);
 ///     svg.rect(10, 10, 50, 20, "c0", "the first clip");
-///     page += svg.html("clips", "Clips", "Two clips on a timeline.");
+///     page += svg.scrollHtml("clips", "Clips", "Two clips on a timeline.");
 ///
 /// Text that a function takes is escaped by it.
 class Svg {
@@ -25,10 +25,12 @@ public:
     /// Elements as they are.
     void add(std::string const& elements) { body_ += elements; }
 
-    /// As it stands in a page, in a box that scrolls where the page is too narrow. `id` is unique
-    /// in the page.
+    /// As it stands in a page. `id` is unique in it.
     std::string html(std::string const& id, std::string_view title,
                      std::string_view description) const;
+    /// The same in a box that scrolls where the page is too narrow.
+    std::string scrollHtml(std::string const& id, std::string_view title,
+                           std::string_view description) const;
 
 private:
     double width_, height_;

@@ -19,7 +19,7 @@ constexpr double rowGap = 6;
 constexpr double axisHeight = 24;
 constexpr double pointHeight = 20;
 constexpr double narrowest = 4;           ///< a bar, in pixels
-constexpr double widestGroup = 28;        ///< that still takes more
+constexpr double widestGroup = 36;        ///< that still takes more
 constexpr std::size_t mostLanes = 6;      ///< of one track
 constexpr std::size_t mostRowsDrawn = 12; ///< of one strip
 constexpr std::size_t mostRowsInAll = 40;
@@ -77,9 +77,12 @@ struct Strips {
             count = static_cast<std::size_t>(strips);
             break;
         }
+        // The labels of the first two ticks, and of the last two, are the closest: one of them
+        // stands beside its tick and one in the middle.
+        double const farthest = -first > last ? first : last;
         tick = length;
         for (double const step : steps)
-            if (across * step / length >= 84) {
+            if (across * step / length >= 1.5 * widthOf(clockText(farthest, step)) + 4) {
                 tick = std::min(length, step);
                 break;
             }
@@ -349,7 +352,7 @@ std::string timelineHtml(Timeline timeline, std::string const& id, std::string c
     Strips const strips(first, last, median(std::move(lengths)),
                         std::clamp<std::size_t>(mostRowsInAll / rows.size(), 1, 8));
     Picture const picture(rows, timeline.points, strips);
-    std::string html = picture.svg().html(
+    std::string html = picture.svg().scrollHtml(
         id, title,
         counted(count, "item") + " from " + timecodeText(first) + " to " + timecodeText(last) +
             (strips.count > 1 ? ", in " + counted(strips.count, "strip") + " one below the other"

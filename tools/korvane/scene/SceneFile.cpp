@@ -1,22 +1,19 @@
 #include "SceneFile.h"
 
+#include "../FileBytes.h"
 #include "../Input.h"
 #include "../ToolError.h"
 
 #include <korvane/serialization/KVBinaryXMLReadStream.h>
 #include <korvane/serialization/KVBinaryXMLWriteStream.h>
-#include <korvane/serialization/KVBufferReadStream.h>
 #include <korvane/serialization/KVFileReadStream.h>
 #include <korvane/serialization/KVHashWriteStream.h>
 #include <korvane/serialization/KVXMLReadStream.h>
 #include <korvane/serialization/KVXMLStreamElement.h>
 #include <korvane/serialization/KVXMLWriteStream.h>
 
-#include <cstring>
-#include <filesystem>
-#include <fstream>
-#include <limits>
-#include <optional>
+#include <algorithm>
+#include <cstdio>
 
 namespace scene {
 
@@ -95,8 +92,9 @@ private:
     std::vector<Finding>& list_;
 };
 
-void loadText(KVXMLReadStream& stream, std::string const& path, Document& document, bool strict)
+void loadText(KVURL const& url, std::string const& path, Document& document, bool strict)
 {
+    KVXMLReadStream stream(url);
     FindingList findings(document.findings);
     if (strict) {
         stream.setObserver(&findings);
@@ -104,7 +102,10 @@ void loadText(KVXMLReadStream& stream, std::string const& path, Document& docume
     }
     RootHandler root(document.root);
     stream.pushHandler(&root);
-    bool const whole = stream.parse();
+    bool const whole = [&] {
+        QuietLibrary const quiet;
+        return stream.parse();
+    }();
     document.root.setFindings(nullptr);
     if (!whole) {
         std::string const reason =
@@ -117,8 +118,9 @@ void loadText(KVXMLReadStream& stream, std::string const& path, Document& docume
     checkVersion(stream, path);
 }
 
-void loadBinary(KVStream& bytes, std::string const& path, Document& document, bool strict)
+void loadBinary(KVURL const& url, std::string const& path, Document& document, bool strict)
 {
+    KVFileReadStream bytes(url);
     FindingList findings(document.findings);
     if (strict)
         document.root.setFindings(&findings);
@@ -137,12 +139,6 @@ Form formOf(std::string_view start) noexcept
     return start.starts_with(binarySignature) ? Form::Binary : Form::Text;
 }
 
-void refuseEmpty(std::string const& path, unsigned long long bytes)
-{
-    if (bytes == 0)
-        throw badInput(path, "the file is empty");
-}
-
 } // namespace
 
 char const* nameOf(Form form) noexcept
@@ -150,40 +146,20 @@ char const* nameOf(Form form) noexcept
     return form == Form::Text ? "text" : "binary";
 }
 
-void loadBytes(std::string_view bytes, std::string const& path, Document& document, bool strict)
-{
-    refuseEmpty(path, bytes.size());
-    document.bytes = bytes.size();
-    document.form = formOf(bytes);
-    if (document.form == Form::Binary) {
-        KVBufferReadStream stream(bytes.data(), bytes.size());
-        return loadBinary(stream, path, document, strict);
-    }
-    if (bytes.size() > static_cast<std::size_t>(std::numeric_limits<int>::max()))
-        throw badInput(path, "more than 2 GiB: read it from a file");
-    KVXMLReadStream stream(bytes.data(), static_cast<int>(bytes.size()));
-    loadText(stream, path, document, strict);
-}
-
 void load(std::string const& path, Document& document, bool strict)
 {
-    if (path == "-")
-        return loadBytes(readFile(path), path, document, strict);
-    checkReadable(path);
-    std::error_code error;
-    document.bytes = std::filesystem::file_size(path, error);
-    char start[binarySignature.size()] = {};
-    std::ifstream(path, std::ios::binary).read(start, sizeof start);
-    if (!error)
-        refuseEmpty(path, document.bytes);
-    document.form = formOf({start, sizeof start});
-    KVURL const url(path.c_str());
-    if (document.form == Form::Binary) {
-        KVFileReadStream stream(url);
-        return loadBinary(stream, path, document, strict);
-    }
-    KVXMLReadStream stream(url);
-    loadText(stream, path, document, strict);
+    ReopenableFile const reopenable(path);
+    FileBytes const file(reopenable.path());
+    document.bytes = file.length();
+    if (document.bytes == 0)
+        throw badInput(path, "the file is empty");
+    char start[binarySignature.size()];
+    document.form = formOf({start, file.read(0, start, sizeof start)});
+    KVURL const url(reopenable.path().c_str());
+    if (document.form == Form::Binary)
+        loadBinary(url, path, document, strict);
+    else
+        loadText(url, path, document, strict);
 }
 
 void save(Node& root, Form form, KVStream& stream)

@@ -6,7 +6,6 @@
 #include <korvane/serialization/KVStream.h>
 
 #include <string>
-#include <string_view>
 #include <vector>
 
 namespace scene {
@@ -35,9 +34,6 @@ struct Document {
 /// code 4 for what cannot be read, code 3 with the line for what is no document.
 /// With `strict`, values are checked to their last character, and findings carry their lines.
 void load(std::string const& path, Document& document, bool strict = false);
-/// Reads a document from memory; `path` is for messages.
-void loadBytes(std::string_view bytes, std::string const& path, Document& document,
-               bool strict = false);
 
 /// The document's bytes in that form.
 void save(Node& root, Form form, KVStream& stream);
