@@ -326,7 +326,10 @@ TEST(SRTTags, ParsedTextHasItsStylesAndColours)
         {"{b}ab{/b}c", "abc", "110", "ffffff"},
         {"a<b>b<i>c</b>d</i>e", "abcde", "01320", "ffffff"},
         {"<u>a<b>b</u>c", "abc", "451", "ffffff"},
+        // Each style counts its own tags.
         {"<b><b>a</b>b</b>c", "abc", "110", "ffffff"},
+        {"<i><i>a</i>b</i></i><i>c", "abc", "220", "ffffff"},
+        {"<u><u>a</u>b</u></u><u>c", "abc", "440", "ffffff"},
         // A stray closing tag takes the next opening one with it.
         {"a</b><b>b</b><b>c<b>d", "abcd", "0001", "ffffff"},
         {"a<br>b<i><BR/></i>c", "a\nb\nc", "00020", "ffffff"},
