@@ -11,7 +11,9 @@
 class MemoryFile {
 public:
     explicit MemoryFile(std::uint8_t const* bytes = nullptr, std::size_t size = 0)
-        : fd_(memfd_create("fuzz", 0)), url_(("/proc/self/fd/" + std::to_string(fd_)).c_str())
+        : fd_(memfd_create("fuzz", 0)),
+          path_("/proc/self/fd/" + std::to_string(fd_)),
+          url_(path_.c_str())
     {
         for (std::size_t done = 0; done < size;) {
             ssize_t const put = write(fd_, bytes + done, size - done);
@@ -24,9 +26,11 @@ public:
     MemoryFile& operator=(MemoryFile const&) = delete;
     ~MemoryFile() { close(fd_); }
 
+    std::string const& path() const { return path_; }
     CFURLRef url() const { return url_.cf_url(); }
 
 private:
     int fd_;
+    std::string path_;
     KVURL url_;
 };

@@ -1,6 +1,7 @@
 // Any bytes as a project in either form. What could be read is written in both forms and read
 // back: the hash stays the same.
 
+#include "MemoryFile.h"
 #include "ToolError.h"
 #include "scene/SceneFile.h"
 
@@ -52,9 +53,9 @@ KVHash128 hashThrough(scene::Form form, scene::Node& root)
 {
     KVBufferWriteStream bytes(4096, 4096);
     scene::save(root, form, bytes);
+    MemoryFile const file(bytes.getBuffer(), bytes.getBufferSize());
     scene::Document copy;
-    scene::loadBytes({reinterpret_cast<char const*>(bytes.getBuffer()), bytes.getBufferSize()},
-                     "copy", copy);
+    scene::load(file.path(), copy);
     return hashOf(copy.root);
 }
 
@@ -62,9 +63,10 @@ KVHash128 hashThrough(scene::Form form, scene::Node& root)
 
 extern "C" int LLVMFuzzerTestOneInput(std::uint8_t const* data, std::size_t size)
 {
+    MemoryFile const file(data, size);
     scene::Document document;
     try {
-        scene::loadBytes({reinterpret_cast<char const*>(data), size}, "input", document);
+        scene::load(file.path(), document);
     } catch (ToolError const&) {
         // What has been read up to there is a document too.
     }
