@@ -148,22 +148,22 @@ public:
     // --- Properties ---
     //
     // All but the first throw KVIllegalArgumentException for separators,
-    // KV_BLEND_SUPPORTED_LIST_END and numbers that are no mode. Those that say so throw
-    // KVUnsupportedOperationException for KV_BLEND_AVERAGE to KV_BLEND_TEST, KV_BLEND_NONE
-    // excepted.
+    // KV_BLEND_SUPPORTED_LIST_END and numbers that are no mode. KV_BLEND_AVERAGE to KV_BLEND_TEST,
+    // KV_BLEND_NONE excepted, are the modes without an answer: those that say so throw
+    // KVUnsupportedOperationException for them.
 
     /// Whether the two layers may be exchanged; false for what is no mode.
     static bool isAbelian(KVBlendMode mode) noexcept;
-    /// Whether layers may be grouped in any way. Throws for the modes that are not implemented.
+    /// Whether layers may be grouped in any way. Throws for the modes without an answer.
     static bool isAssociative(KVBlendMode mode);
     /// Whether over nothing the mode leaves the layer as KV_BLEND_NORMAL does. Throws for the modes
-    /// that are not implemented.
+    /// without an answer.
     static bool isNormalOverNothing(KVBlendMode mode);
     /// Whether nothing over nothing is nothing; the same answers as `isNormalOverNothing`, failures
     /// too.
     static bool isNothingOverNothing(KVBlendMode mode);
-    /// Whether a black layer gives what KV_BLEND_NORMAL gives; false for the modes that are not
-    /// implemented.
+    /// Whether a black layer gives what KV_BLEND_NORMAL gives; false for the modes without an
+    /// answer.
     static bool treatsBlackLikeNormal(KVBlendMode mode);
 
     /// The blend mode of the same name; KV_BLEND_NORMAL for any other value.
